@@ -1,0 +1,81 @@
+#include "framework/Strings.h"
+
+#include <strsafe.h>
+
+#include <cstdarg>
+
+namespace fw {
+namespace {
+HINSTANCE g_resourceModule = nullptr;
+}
+
+HINSTANCE GetResourceHandle() { return g_resourceModule ? g_resourceModule : GetModuleHandleW(nullptr); }
+
+void SetResourceHandle(HINSTANCE module) { g_resourceModule = module; }
+
+CString LoadString(UINT id) {
+  // With a zero length LoadStringW hands out a pointer into the resource itself, which is not
+  // zero-terminated; the returned length is what counts.
+  const wchar_t* text = nullptr;
+  int length = LoadStringW(GetResourceHandle(), id, reinterpret_cast<LPWSTR>(&text), 0);
+  if (length <= 0 || text == nullptr) return CString();
+  return CString(text, static_cast<size_t>(length));
+}
+
+CString FormatV(const wchar_t* format, va_list args) {
+  if (format == nullptr) return CString();
+  // Grow until the text fits; the strsafe formatter follows Windows' "%s" rule on every compiler.
+  for (size_t capacity = 256; capacity <= STRSAFE_MAX_CCH; capacity *= 4) {
+    std::vector<wchar_t> buffer(capacity);
+    va_list copy;
+    va_copy(copy, args);
+    HRESULT hr = StringCchVPrintfW(buffer.data(), capacity, format, copy);
+    va_end(copy);
+    if (SUCCEEDED(hr)) return CString(buffer.data());
+    if (hr != STRSAFE_E_INSUFFICIENT_BUFFER) return CString();
+  }
+  return CString();
+}
+
+CString Format(const wchar_t* format, ...) {
+  va_list args;
+  va_start(args, format);
+  CString text = FormatV(format, args);
+  va_end(args);
+  return text;
+}
+
+CString FormatString(UINT id, ...) {
+  CString format = LoadString(id);
+  va_list args;
+  va_start(args, id);
+  CString text = FormatV(format.c_str(), args);
+  va_end(args);
+  return text;
+}
+
+CString FormatMessageString(UINT id, const std::vector<CString>& inserts) {
+  CString format = LoadString(id);
+  if (format.empty()) return CString();
+  std::vector<DWORD_PTR> args;
+  for (const CString& insert : inserts) args.push_back(reinterpret_cast<DWORD_PTR>(insert.c_str()));
+  // Unused insert numbers must still point at something.
+  while (args.size() < 9) args.push_back(reinterpret_cast<DWORD_PTR>(L""));
+  wchar_t* out = nullptr;
+  DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_STRING | FORMAT_MESSAGE_ALLOCATE_BUFFER |
+                                    FORMAT_MESSAGE_ARGUMENT_ARRAY,
+                                format.c_str(), 0, 0, reinterpret_cast<LPWSTR>(&out), 0,
+                                reinterpret_cast<va_list*>(args.data()));
+  CString text;
+  if (length > 0 && out != nullptr) text.assign(out, length);
+  if (out != nullptr) LocalFree(out);
+  return text;
+}
+
+CString ToUpper(const CString& text) {
+  CString upper = text;
+  if (!upper.empty()) CharUpperBuffW(&upper[0], static_cast<DWORD>(upper.size()));
+  return upper;
+}
+
+}  // namespace fw

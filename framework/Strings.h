@@ -1,0 +1,33 @@
+// Text types and string-table access. Every text a user sees is loaded through here, from the
+// current resource module (the localized resource library once start-up has chosen one).
+#pragma once
+
+#include <windows.h>
+
+#include <string>
+#include <vector>
+
+using CString = std::wstring;
+using CStringArray = std::vector<std::wstring>;
+
+namespace fw {
+
+// The module that dialogs, strings, icons and images are loaded from. Starts as the program's
+// own module; start-up switches it to the localized resource library.
+HINSTANCE GetResourceHandle();
+void SetResourceHandle(HINSTANCE module);
+
+// String-table entry id of the current resource module; empty when it has none.
+CString LoadString(UINT id);
+// printf-style formatting of a wide format ("%s" takes a wide string, as on Windows).
+CString FormatV(const wchar_t* format, va_list args);
+CString Format(const wchar_t* format, ...);
+// String-table entry id used as a printf-style format.
+CString FormatString(UINT id, ...);
+// String-table entry id with "%1".."%9" inserts filled by the system's message formatting;
+// empty when the entry is missing.
+CString FormatMessageString(UINT id, const std::vector<CString>& inserts);
+
+CString ToUpper(const CString& text);
+
+}  // namespace fw

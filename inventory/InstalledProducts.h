@@ -1,0 +1,65 @@
+// The suite products the console knows, where each keeps its installation record, and how the
+// console decides which of them are installed. Everything here only reads.
+#pragma once
+
+#include <windows.h>
+
+#include <string>
+#include <vector>
+
+#include "inventory/SuiteRuntimeEnumerator.h"
+
+enum class ProductKind { Engine = 0, Desktop = 1, Skyloft = 2, Server = 3 };
+
+// The detection result; one instance lives in the main window.
+struct InstalledProducts {
+  std::wstring version;
+  std::wstring desktopKey;
+  std::wstring engineKey;
+  std::wstring skyloftKey;
+  std::wstring serverKey;
+  bool desktopInstalled = false;
+  bool engineInstalled = false;
+  bool skyloftInstalled = false;
+  bool serverInstalled = false;  // no detection rule sets it: a Server is never reported
+
+  // Kept by ListInstalledRuntimeVersions for DetectInstalledProducts; empty when the suite's
+  // runtime-information component is not registered.
+  ComRef<ISuiteRuntimeInfo> runtimeInfo;
+  ComRef<ISuiteRuntimeEnumerator> runtimeEnumerator;
+};
+
+// The installation values of one product, as text; defaults are the report's.
+struct ProductInstallInfo {
+  std::wstring installDir;
+  std::wstring installer;
+  std::wstring productName;
+  std::wstring imageLocation;
+  std::wstring installDate;
+  std::wstring installTime;
+  std::wstring realVersion;
+  std::wstring spNumber = L"0";
+  std::wstring spBuild = L"0";
+  std::wstring spInstaller = L"N/A";
+  std::wstring spInstallDate = L"N/A";
+  std::wstring spInstallTime = L"N/A";
+  std::wstring spStatus = L"N/A";
+  std::wstring spDisplayName;
+  std::wstring productVersion = L"?";
+};
+
+// The release the console administers: "10.5".
+std::wstring GetProductVersion();
+
+// Reads any value of any type and size as UTF-16 text up to its first zero character;
+// defaultText when the key or the value cannot be read. Keys naming "Skyloft2016.1" are read
+// through the 64-bit registry view.
+std::wstring ReadRegistryString(HKEY hive, const std::wstring& subkey, const std::wstring& valueName,
+                                const std::wstring& defaultText);
+
+void DetectInstalledProducts(InstalledProducts& products);
+ProductInstallInfo ReadProductInstallInfo(ProductKind kind, const std::wstring& productKey);
+bool GetInstallDir(int productIndex, std::wstring version, std::wstring& installDir);
+std::wstring GetProductBinFolder(const std::wstring& productKey);
+std::wstring GetCoreProductVersion(const std::wstring& installDir);
+std::vector<std::wstring> ListInstalledRuntimeVersions(InstalledProducts& products);

@@ -1,0 +1,38 @@
+// The suite's runtime-information component: a COM object, installed with the suite, that lists
+// the suite runtimes present on the workstation. The console only consumes it; where it is not
+// registered, detection simply does without it.
+//
+// Identifiers (ours; the component registers under them):
+//   class     SuiteRuntimeInfo            {FCF2C989-22CC-434D-B739-606620863616}
+//   interface ISuiteRuntimeInfo           {6FAE15CA-1492-4F0B-87E5-FE6CE6B97374}
+//   interface ISuiteRuntimeEnumerator     {2F8389F9-DEAC-4EDF-88CC-12273CC4C922}
+//
+// Use: CoCreateInstance(CLSID_SuiteRuntimeInfo), OleRun, ISuiteRuntimeInfo::GetEnumerator, then
+// Reset and Next until Next reports S_FALSE (no more items) or fails.
+#pragma once
+
+#include <windows.h>
+#include <oleauto.h>
+
+#include "framework/ComRef.h"
+
+// Product codes that Next reports.
+enum SuiteRuntimeProduct : long { kSuiteRuntimeDesktop = 1, kSuiteRuntimeEngine = 2 };
+
+inline constexpr CLSID CLSID_SuiteRuntimeInfo = {
+    0xfcf2c989, 0x22cc, 0x434d, {0xb7, 0x39, 0x60, 0x66, 0x20, 0x86, 0x36, 0x16}};
+inline constexpr IID IID_ISuiteRuntimeInfo = {
+    0x6fae15ca, 0x1492, 0x4f0b, {0x87, 0xe5, 0xfe, 0x6c, 0xe6, 0xb9, 0x73, 0x74}};
+inline constexpr IID IID_ISuiteRuntimeEnumerator = {
+    0x2f8389f9, 0xdeac, 0x4edf, {0x88, 0xcc, 0x12, 0x27, 0x3c, 0xc4, 0xc9, 0x22}};
+
+struct ISuiteRuntimeEnumerator : public IUnknown {
+  // Starts the walk again at the first item.
+  virtual HRESULT STDMETHODCALLTYPE Reset() = 0;
+  // S_OK with one item (the caller frees both texts), S_FALSE when no item is left.
+  virtual HRESULT STDMETHODCALLTYPE Next(long* productCode, BSTR* versionText, BSTR* detailText) = 0;
+};
+
+struct ISuiteRuntimeInfo : public IUnknown {
+  virtual HRESULT STDMETHODCALLTYPE GetEnumerator(ISuiteRuntimeEnumerator** enumerator) = 0;
+};

@@ -1,0 +1,1 @@
+#include "locale/KVELLocale.h"

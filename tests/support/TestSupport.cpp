@@ -1,0 +1,142 @@
+#include "tests/support/TestSupport.h"
+
+#include <shlobj.h>
+#include <shlwapi.h>
+
+namespace testing_support {
+
+ScopedRegistryKey::ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view)
+    : root_(root), path_(std::move(path)), view_(view) {
+  RegDeleteTreeW(root_, path_.c_str());
+  if (view_ != 0) {
+    HKEY parent = nullptr;
+    // RegDeleteTree has no view flag; open the key's own view and clear it from there.
+    if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_ALL_ACCESS | view_, &parent) == ERROR_SUCCESS) {
+      RegDeleteTreeW(parent, nullptr);
+      RegCloseKey(parent);
+    }
+    RegDeleteKeyExW(root_, path_.c_str(), view_, 0);
+  }
+}
+
+ScopedRegistryKey::~ScopedRegistryKey() {
+  HKEY key = nullptr;
+  if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_ALL_ACCESS | view_, &key) == ERROR_SUCCESS) {
+    RegDeleteTreeW(key, nullptr);
+    RegCloseKey(key);
+  }
+  RegDeleteKeyExW(root_, path_.c_str(), view_, 0);
+}
+
+static void SetValue(HKEY root, const std::wstring& path, REGSAM view, const wchar_t* name, DWORD type,
+                     const void* data, DWORD size) {
+  HKEY key = nullptr;
+  if (RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key,
+                      nullptr) != ERROR_SUCCESS)
+    return;
+  RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size);
+  RegCloseKey(key);
+}
+
+void ScopedRegistryKey::SetString(const wchar_t* name, const std::wstring& value, DWORD type) {
+  SetValue(root_, path_, view_, name, type, value.c_str(),
+           static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
+}
+
+void ScopedRegistryKey::SetDword(const wchar_t* name, DWORD value) {
+  SetValue(root_, path_, view_, name, REG_DWORD, &value, sizeof value);
+}
+
+void ScopedRegistryKey::SetBinary(const wchar_t* name, const void* data, DWORD size, DWORD type) {
+  SetValue(root_, path_, view_, name, type, data, size);
+}
+
+void ScopedRegistryKey::DeleteValue(const wchar_t* name) {
+  HKEY key = nullptr;
+  if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_SET_VALUE | view_, &key) != ERROR_SUCCESS) return;
+  RegDeleteValueW(key, name);
+  RegCloseKey(key);
+}
+
+bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value) {
+  DWORD type = 0, size = sizeof value;
+  return RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, &type, &value, &size) == ERROR_SUCCESS &&
+         type == REG_DWORD && size == sizeof value;
+}
+
+bool ValueExists(HKEY root, const std::wstring& path, const wchar_t* name) {
+  return RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, nullptr, nullptr, nullptr) == ERROR_SUCCESS;
+}
+
+void RemoveTree(const std::wstring& path) {
+  WIN32_FIND_DATAW data;
+  HANDLE find = FindFirstFileW((path + L"\\*").c_str(), &data);
+  if (find != INVALID_HANDLE_VALUE) {
+    do {
+      std::wstring name = data.cFileName;
+      if (name == L"." || name == L"..") continue;
+      std::wstring child = path + L"\\" + name;
+      if (data.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY) {
+        RemoveTree(child);
+      } else {
+        SetFileAttributesW(child.c_str(), FILE_ATTRIBUTE_NORMAL);
+        DeleteFileW(child.c_str());
+      }
+    } while (FindNextFileW(find, &data));
+    FindClose(find);
+  }
+  if (!RemoveDirectoryW(path.c_str())) DeleteFileW(path.c_str());
+}
+
+bool CreateDirectories(const std::wstring& path) {
+  int rc = SHCreateDirectoryExW(nullptr, path.c_str(), nullptr);
+  return rc == ERROR_SUCCESS || rc == ERROR_ALREADY_EXISTS || rc == ERROR_FILE_EXISTS;
+}
+
+bool CopyFileTo(const std::wstring& from, const std::wstring& to) {
+  std::wstring folder = to;
+  PathRemoveFileSpecW(&folder[0]);
+  folder.resize(wcslen(folder.c_str()));
+  CreateDirectories(folder);
+  return CopyFileW(from.c_str(), to.c_str(), FALSE) != FALSE;
+}
+
+ScopedDirectory::ScopedDirectory(std::wstring path) : path_(std::move(path)) { RemoveTree(path_); }
+
+ScopedDirectory::~ScopedDirectory() { RemoveTree(path_); }
+
+std::wstring ScopedDirectory::MakeDir(const std::wstring& relative) const {
+  std::wstring full = path_ + L"\\" + relative;
+  CreateDirectories(full);
+  return full;
+}
+
+std::wstring ScopedDirectory::MakeFile(const std::wstring& relative, const std::string& content) const {
+  std::wstring full = path_ + L"\\" + relative;
+  std::wstring folder = full.substr(0, full.find_last_of(L'\\'));
+  CreateDirectories(folder);
+  HANDLE file = CreateFileW(full.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS, 0, nullptr);
+  if (file != INVALID_HANDLE_VALUE) {
+    DWORD written = 0;
+    WriteFile(file, content.data(), static_cast<DWORD>(content.size()), &written, nullptr);
+    CloseHandle(file);
+  }
+  return full;
+}
+
+std::wstring CommonFilesFolder() {
+  wchar_t path[MAX_PATH] = L"";
+  SHGetSpecialFolderPathW(nullptr, path, CSIDL_PROGRAM_FILES_COMMON, FALSE);
+  return path;
+}
+
+std::wstring MaporaCommonFolder() { return CommonFilesFolder() + L"\\Mapora"; }
+
+std::wstring ModuleFolder() {
+  wchar_t path[MAX_PATH] = L"";
+  GetModuleFileNameW(nullptr, path, MAX_PATH);
+  PathRemoveFileSpecW(path);
+  return path;
+}
+
+}  // namespace testing_support

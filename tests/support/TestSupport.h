@@ -1,0 +1,63 @@
+// Fixtures for tests that run in the shared Wine test prefix. Tests take turns in that prefix,
+// so whatever a test creates in the registry or on disk it removes again through these.
+#pragma once
+
+#include <windows.h>
+
+#include <string>
+#include <vector>
+
+namespace testing_support {
+
+// Deletes a registry key tree when created and again when destroyed; creates nothing itself.
+class ScopedRegistryKey {
+ public:
+  ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view = 0);
+  ~ScopedRegistryKey();
+  ScopedRegistryKey(const ScopedRegistryKey&) = delete;
+  ScopedRegistryKey& operator=(const ScopedRegistryKey&) = delete;
+
+  void SetString(const wchar_t* name, const std::wstring& value, DWORD type = REG_SZ);
+  void SetDword(const wchar_t* name, DWORD value);
+  void SetBinary(const wchar_t* name, const void* data, DWORD size, DWORD type = REG_BINARY);
+  void DeleteValue(const wchar_t* name);
+
+ private:
+  HKEY root_;
+  std::wstring path_;
+  REGSAM view_;
+};
+
+// Reads a DWORD value; false when the key or value is missing or not a DWORD.
+bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
+bool ValueExists(HKEY root, const std::wstring& path, const wchar_t* name);
+
+// A folder tree removed (recursively) when created and again when destroyed.
+class ScopedDirectory {
+ public:
+  explicit ScopedDirectory(std::wstring path);
+  ~ScopedDirectory();
+  ScopedDirectory(const ScopedDirectory&) = delete;
+  ScopedDirectory& operator=(const ScopedDirectory&) = delete;
+
+  const std::wstring& Path() const { return path_; }
+  // Creates path\relative (and its parents) as a folder.
+  std::wstring MakeDir(const std::wstring& relative) const;
+  // Writes a small file path\relative, creating its folders.
+  std::wstring MakeFile(const std::wstring& relative, const std::string& content = "x") const;
+
+ private:
+  std::wstring path_;
+};
+
+void RemoveTree(const std::wstring& path);
+bool CreateDirectories(const std::wstring& path);
+bool CopyFileTo(const std::wstring& from, const std::wstring& to);
+
+// <Common Files> as the program sees it, and <Common Files>\Mapora.
+std::wstring CommonFilesFolder();
+std::wstring MaporaCommonFolder();
+// Folder of the running test program.
+std::wstring ModuleFolder();
+
+}  // namespace testing_support
