@@ -1,0 +1,178 @@
+#include "framework/App.h"
+
+#include <objbase.h>
+#include <ole2.h>
+#include <shellapi.h>
+
+namespace {
+CWinApp* g_app = nullptr;
+
+// The description the system has for an HRESULT, in the user's language.
+CString DescribeError(HRESULT hr) {
+  wchar_t* text = nullptr;
+  DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER |
+                                    FORMAT_MESSAGE_IGNORE_INSERTS,
+                                nullptr, static_cast<DWORD>(hr), 0, reinterpret_cast<LPWSTR>(&text), 0, nullptr);
+  CString description;
+  if (length > 0 && text != nullptr) description.assign(text, length);
+  if (text != nullptr) LocalFree(text);
+  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
+    description.pop_back();
+  CString code = fw::Format(L"0x%08lX", static_cast<unsigned long>(hr));
+  return description.empty() ? code : description + L" (" + code + L")";
+}
+}  // namespace
+
+// Keeps outgoing COM calls patient: a rejected call is retried and a slow one waited for,
+// while the user interface goes on painting.
+class CWinApp::MessageFilter final : public IMessageFilter {
+ public:
+  DWORD m_pendingDelay = 8000;
+
+  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** out) override {
+    if (out == nullptr) return E_POINTER;
+    if (IsEqualIID(iid, IID_IUnknown) || IsEqualIID(iid, IID_IMessageFilter)) {
+      *out = static_cast<IMessageFilter*>(this);
+      return S_OK;
+    }
+    *out = nullptr;
+    return E_NOINTERFACE;
+  }
+  // Owned by the application object, which outlives every registration.
+  ULONG STDMETHODCALLTYPE AddRef() override { return 1; }
+  ULONG STDMETHODCALLTYPE Release() override { return 1; }
+
+  DWORD STDMETHODCALLTYPE HandleInComingCall(DWORD, HTASK, DWORD, LPINTERFACEINFO) override {
+    return SERVERCALL_ISHANDLED;
+  }
+  DWORD STDMETHODCALLTYPE RetryRejectedCall(HTASK, DWORD, DWORD rejectType) override {
+    // "Retry later" is retried after a short pause; a plain rejection is final.
+    return rejectType == SERVERCALL_RETRYLATER ? 100 : static_cast<DWORD>(-1);
+  }
+  DWORD STDMETHODCALLTYPE MessagePending(HTASK, DWORD, DWORD) override { return PENDINGMSG_WAITDEFPROCESS; }
+};
+
+void CCommandLineInfo::ParseParam(const wchar_t*, BOOL, BOOL isLast) { ParseLast(isLast); }
+
+void CCommandLineInfo::ParseLast(BOOL isLast) {
+  if (isLast) m_bParsedAll = true;
+}
+
+CWinApp::CWinApp() { g_app = this; }
+
+CWinApp::~CWinApp() {
+  delete m_messageFilter;
+  if (g_app == this) g_app = nullptr;
+}
+
+CWinApp* AfxGetApp() { return g_app; }
+
+BOOL CWinApp::InitInstance() { return TRUE; }
+
+int CWinApp::ExitInstance() {
+  if (m_oleInitialized) {
+    CoRegisterMessageFilter(nullptr, nullptr);
+    OleUninitialize();
+    m_oleInitialized = false;
+  }
+  return 0;
+}
+
+int CWinApp::Run() {
+  MSG msg;
+  while (GetMessageW(&msg, nullptr, 0, 0) > 0) {
+    TranslateMessage(&msg);
+    DispatchMessageW(&msg);
+  }
+  ExitInstance();
+  return static_cast<int>(msg.wParam);
+}
+
+bool CWinApp::OnCmdMsg(UINT) { return false; }
+
+void CWinApp::ProcessWndProcException(std::exception_ptr error) {
+  CString detail;
+  try {
+    std::rethrow_exception(error);
+  } catch (const ComError& e) {
+    detail = DescribeError(e.Error());
+  } catch (...) {
+    detail = DescribeError(E_UNEXPECTED);
+  }
+  CString text = fw::FormatString(IDS_FRAMEWORK_OPERATION_FAILED, detail.c_str());
+  AfxMessageBox(text.empty() ? detail : text, MB_OK | MB_ICONERROR);
+}
+
+void CWinApp::ParseCommandLine(CCommandLineInfo& info) {
+  int argc = 0;
+  LPWSTR* argv = CommandLineToArgvW(GetCommandLineW(), &argc);
+  if (argv == nullptr) return;
+  for (int i = 1; i < argc; ++i) {
+    const wchar_t* param = argv[i];
+    BOOL isFlag = (param[0] == L'-' || param[0] == L'/') ? TRUE : FALSE;
+    info.ParseParam(isFlag ? param + 1 : param, isFlag, i == argc - 1 ? TRUE : FALSE);
+  }
+  LocalFree(argv);
+}
+
+bool CWinApp::InitOle() {
+  if (FAILED(OleInitialize(nullptr))) return false;
+  m_oleInitialized = true;
+  if (m_messageFilter == nullptr) m_messageFilter = new MessageFilter;
+  CoRegisterMessageFilter(m_messageFilter, nullptr);
+  return true;
+}
+
+void CWinApp::SetMessagePendingDelay(DWORD milliseconds) {
+  if (m_messageFilter == nullptr) m_messageFilter = new MessageFilter;
+  m_messageFilter->m_pendingDelay = milliseconds;
+}
+
+void CWinApp::EnableControlContainer() {
+  // The console's dialog templates carry only system controls; hosting them needs nothing more.
+  // Kept so that start-up reads like every other suite program's.
+}
+
+bool CWinApp::InitRichEdit() {
+  // RICHED32 is the classic entry point; the templates use RichEdit20W, which RICHED20 registers.
+  HMODULE classic = LoadLibraryW(L"RICHED32.DLL");
+  HMODULE current = LoadLibraryW(L"RICHED20.DLL");
+  return classic != nullptr || current != nullptr;
+}
+
+void CWinApp::OnHelp() {
+  HWND active = GetActiveWindow();
+  if (active != nullptr && SendMessageW(active, WM_COMMANDHELP, 0, 0)) return;
+  if (m_pMainWnd != nullptr && m_pMainWnd->m_hWnd != active && m_pMainWnd->m_hWnd != nullptr)
+    SendMessageW(m_pMainWnd->m_hWnd, WM_COMMANDHELP, 0, 0);
+}
+
+CString CWinApp::GetAppName() const {
+  CString name = fw::LoadString(IDS_FRAMEWORK_APP_TITLE);
+  if (!name.empty()) return name;
+  wchar_t path[MAX_PATH] = L"";
+  GetModuleFileNameW(nullptr, path, MAX_PATH);
+  CString file = path;
+  size_t slash = file.find_last_of(L"\\/");
+  if (slash != CString::npos) file.erase(0, slash + 1);
+  size_t dot = file.rfind(L'.');
+  if (dot != CString::npos) file.erase(dot);
+  return file;
+}
+
+int AfxMessageBox(const CString& text, UINT type) {
+  HWND owner = nullptr;
+  if (g_app != nullptr && g_app->m_pMainWnd != nullptr) owner = g_app->m_pMainWnd->m_hWnd;
+  CString caption = g_app ? g_app->GetAppName() : CString();
+  return MessageBoxW(owner, text.c_str(), caption.c_str(), type);
+}
+
+int AfxMessageBox(UINT stringId, UINT type) { return AfxMessageBox(fw::LoadString(stringId), type); }
+
+int AfxWinMain(HINSTANCE instance) {
+  CWinApp* app = AfxGetApp();
+  if (app == nullptr) return 1;
+  app->m_hInstance = instance;
+  if (!app->InitInstance()) return app->ExitInstance();
+  return app->Run();
+}
