@@ -1,0 +1,31 @@
+// The workstation page: the installation report of the installed suite products, rebuilt each
+// time the page is selected, and the "Advanced..." button.
+#pragma once
+
+#include "framework/Dialog.h"
+
+class CClientAdminDlg;
+
+class CClientMaporaConfigDlg : public CDialog {
+ public:
+  CClientMaporaConfigDlg();
+
+  // Rebuilds the report from the registry and the file system.
+  void BuildInstallationReport();
+
+  CClientAdminDlg* m_pAdminDlg = nullptr;  // set by the main window before the page is created
+
+ protected:
+  void DoDataExchange(CDataExchange* pDX) override;
+  BOOL OnInitDialog() override;
+  const MessageMap* GetMessageMap() const override;
+
+ private:
+  LRESULT OnAdvanced(WPARAM wParam, LPARAM lParam);
+  void UpdateAdvancedButton();
+
+  CWnd m_richEdit;
+};
+
+// The page object lives as long as the program; its window only while the main window does.
+CClientMaporaConfigDlg& GetRootPage();
