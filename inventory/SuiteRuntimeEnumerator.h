@@ -7,8 +7,19 @@
 //   interface ISuiteRuntimeInfo           {6FAE15CA-1492-4F0B-87E5-FE6CE6B97374}
 //   interface ISuiteRuntimeEnumerator     {2F8389F9-DEAC-4EDF-88CC-12273CC4C922}
 //
+// The component is an in-process server (its interfaces have no proxies), so the console asks
+// for CLSCTX_INPROC_SERVER only.
 // Use: CoCreateInstance(CLSID_SuiteRuntimeInfo), OleRun, ISuiteRuntimeInfo::GetEnumerator, then
 // Reset and Next until Next reports S_FALSE (no more items) or fails.
+//
+// The stand-in server in standins/runtime-info (SuiteRuntimeInfo.dll, an in-process server with
+// the apartment threading model, registered by regsvr32) serves this interface on workstations
+// without the suite. It lists the runtimes written in the REG_MULTI_SZ value
+//   HKEY_LOCAL_MACHINE\SOFTWARE\KVEL\RuntimeInfo  "Runtimes"
+// one runtime per string, in order: "<product code> <version text> [<detail text>]", fields
+// separated by blanks, for example "1 10.5 Desktop runtime" or "2 10.5". A string that does not
+// start with a decimal product code stands for a damaged entry: Next fails when it reaches it.
+// Reset reads the list again.
 #pragma once
 
 #include <windows.h>
@@ -18,6 +29,10 @@
 
 // Product codes that Next reports.
 enum SuiteRuntimeProduct : long { kSuiteRuntimeDesktop = 1, kSuiteRuntimeEngine = 2 };
+
+// Where the stand-in server keeps its list.
+inline constexpr wchar_t kSuiteRuntimeListKey[] = L"SOFTWARE\\KVEL\\RuntimeInfo";
+inline constexpr wchar_t kSuiteRuntimeListValue[] = L"Runtimes";
 
 inline constexpr CLSID CLSID_SuiteRuntimeInfo = {
     0xfcf2c989, 0x22cc, 0x434d, {0xb7, 0x39, 0x60, 0x66, 0x20, 0x86, 0x36, 0x16}};
