@@ -30,7 +30,9 @@ bool IsControlColorMessage(UINT message) { return message >= WM_CTLCOLORMSGBOX &
 }  // namespace
 
 void DDX_Control(CDataExchange* pDX, int id, CWnd& control) {
-  if (control.m_hWnd == nullptr) control.m_hWnd = pDX->m_pDlgWnd->GetDlgItem(id);
+  // Page objects outlive their windows: a control member still holds the handle from the
+  // window before, so it is bound afresh every time.
+  control.m_hWnd = pDX->m_pDlgWnd->GetDlgItem(id);
 }
 
 void DDX_Text(CDataExchange* pDX, int id, CString& value) {
