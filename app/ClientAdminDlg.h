@@ -43,6 +43,9 @@ class CClientAdminDlg : public CDialog {
   void LoadSettings();
   void BuildPageTree();
   void LoadTreeImages();
+  void ShowSelectedPage();
+  void SetHelpFilePath();
+  void ShowAboutBox();
 
   CWnd m_wndTree;
   HIMAGELIST m_imgTree = nullptr;

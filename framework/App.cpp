@@ -107,12 +107,16 @@ void CWinApp::ParseCommandLine(CCommandLineInfo& info) {
   int argc = 0;
   LPWSTR* argv = CommandLineToArgvW(GetCommandLineW(), &argc);
   if (argv == nullptr) return;
+  WalkCommandLine(info, argc, argv);
+  LocalFree(argv);
+}
+
+void WalkCommandLine(CCommandLineInfo& info, int argc, const wchar_t* const* argv) {
   for (int i = 1; i < argc; ++i) {
-    const wchar_t* param = argv[i];
+    const wchar_t* param = argv[i] != nullptr ? argv[i] : L"";
     BOOL isFlag = (param[0] == L'-' || param[0] == L'/') ? TRUE : FALSE;
     info.ParseParam(isFlag ? param + 1 : param, isFlag, i == argc - 1 ? TRUE : FALSE);
   }
-  LocalFree(argv);
 }
 
 bool CWinApp::InitOle() {

@@ -29,6 +29,10 @@ class CCommandLineInfo {
   bool m_bParsedAll = false;
 };
 
+// Hands arguments 1..argc-1 of argv to info in order. An argument that starts with '-' or '/' is
+// a flag and loses that one character; isLast is set for the last argument only.
+void WalkCommandLine(CCommandLineInfo& info, int argc, const wchar_t* const* argv);
+
 // A failed COM call, raised where a caller cannot go on without its object.
 class ComError : public std::exception {
  public:

@@ -1,0 +1,63 @@
+#include "app/ClientAdminApp.h"
+
+#include <commctrl.h>
+
+#include "app/ClientAdminDlg.h"
+#include "app/CommandLine.h"
+#include "locale/KVELLocale.h"
+#include "res/resource.h"
+
+namespace {
+
+// A remote server may keep an outgoing call waiting this long before the call gives up.
+constexpr DWORD kMessagePendingDelayMs = 45000;
+
+// The control classes the console's templates use: the page tree, the standard controls and
+// the link in the advanced settings.
+void InitCommonControlClasses() {
+  INITCOMMONCONTROLSEX classes = {};
+  classes.dwSize = sizeof classes;
+  classes.dwICC = ICC_TREEVIEW_CLASSES | ICC_STANDARD_CLASSES | ICC_LINK_CLASS;
+  InitCommonControlsEx(&classes);
+}
+
+}  // namespace
+
+CClientAdminApp::~CClientAdminApp() = default;
+
+BOOL CClientAdminApp::InitInstance() {
+  CMDACommandLineInfo commandLine;
+  ParseCommandLine(commandLine);
+
+  if (!commandLine.m_strLang.empty()) KVELLocale::SetupEXEOverRide(LangIdFromText(commandLine.m_strLang));
+
+  // From here on every string, template and image comes from the localized library, if any.
+  HINSTANCE localized = KVELLocale::LoadLocalizedRes(m_hInstance);
+  if (localized != nullptr) fw::SetResourceHandle(localized);
+
+  EnableControlContainer();
+  if (!InitOle()) {
+    AfxMessageBox(IDS_OLE_INIT_FAILED, MB_OK);
+    return FALSE;
+  }
+  SetMessagePendingDelay(kMessagePendingDelayMs);
+  InitRichEdit();
+  InitCommonControlClasses();
+
+  {
+    CClientAdminDlg mainDlg;
+    m_pMainWnd = &mainDlg;
+    mainDlg.DoModal();
+    m_pMainWnd = nullptr;
+  }
+  // The main window has closed: end the program instead of entering a message loop.
+  return FALSE;
+}
+
+bool CClientAdminApp::OnCmdMsg(UINT id) {
+  if (id == ID_HELP) {
+    OnHelp();
+    return true;
+  }
+  return CWinApp::OnCmdMsg(id);
+}

@@ -1,0 +1,258 @@
+#include "app/ClientAdminDlg.h"
+
+#include <objidl.h>
+#include <gdiplus.h>
+#include <htmlhelp.h>
+
+#include <iterator>
+
+#include "app/AboutDlg.h"
+#include "app/RunningSuiteApps.h"
+#include "framework/App.h"
+#include "framework/PngResource.h"
+#include "inventory/ClientMaporaConfigDlg.h"
+#include "locale/KVELLocale.h"
+#include "res/resource.h"
+#include "settings/AdvancedSettings.h"
+
+namespace {
+
+const wchar_t kSettingsKey[] = L"SOFTWARE\\KVEL";
+const wchar_t kUILangIdValue[] = L"UILANGID";
+constexpr DWORD kNoStoredLanguage = 0xFFFFFFFF;
+
+const wchar_t kHelpFileName[] = L"administering_mapora_desktop.chm";
+const wchar_t kHelpTopic[] = L"00030000000r000000.htm";
+
+// Computer names are at most 15 characters (MAX_COMPUTERNAME_LENGTH).
+constexpr DWORD kComputerNameChars = 16;
+
+// Tree images come with white behind their transparent parts; pure blue marks what the image
+// list treats as transparent.
+constexpr COLORREF kPngBackground = RGB(255, 255, 255);
+constexpr COLORREF kTreeMaskColor = RGB(0, 0, 255);
+
+CString ComputerName() {
+  wchar_t name[kComputerNameChars] = L"";
+  DWORD size = kComputerNameChars;
+  if (!GetComputerNameW(name, &size)) return CString();
+  return name;
+}
+
+}  // namespace
+
+CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
+  m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
+  Gdiplus::GdiplusStartupInput gdiplusInput;
+  if (Gdiplus::GdiplusStartup(&m_gdiplusToken, &gdiplusInput, nullptr) != Gdiplus::Ok) m_gdiplusToken = 0;
+}
+
+CClientAdminDlg::~CClientAdminDlg() {
+  if (m_imgTree != nullptr) ImageList_Destroy(m_imgTree);
+  if (m_gdiplusToken != 0) Gdiplus::GdiplusShutdown(m_gdiplusToken);
+}
+
+void CClientAdminDlg::DoDataExchange(CDataExchange* pDX) {
+  CDialog::DoDataExchange(pDX);
+  DDX_Control(pDX, IDC_PAGE_TREE, m_wndTree);
+}
+
+const MessageMap* CClientAdminDlg::GetMessageMap() const {
+  static const MessageMapEntry entries[] = {
+      {WM_SYSCOMMAND, 0, 0, Handler(&CClientAdminDlg::OnSysCommand)},
+      {WM_DESTROY, 0, 0, Handler(&CClientAdminDlg::OnDestroy)},
+      {WM_PAINT, 0, 0, Handler(&CClientAdminDlg::OnPaint)},
+      {WM_QUERYDRAGICON, 0, 0, Handler(&CClientAdminDlg::OnQueryDragIcon)},
+      {WM_COMMAND, IDC_APPLY_NOW, BN_CLICKED, Handler(&CClientAdminDlg::OnApply)},
+      {WM_NOTIFY, IDC_PAGE_TREE, static_cast<UINT>(TVN_SELCHANGEDW), Handler(&CClientAdminDlg::OnTreeSelChanged)},
+      {WM_COMMANDHELP, 0, 0, Handler(&CClientAdminDlg::OnCommandHelp)},
+  };
+  static const MessageMap map = {CDialog::GetMessageMap(), entries, std::size(entries)};
+  return &map;
+}
+
+BOOL CClientAdminDlg::OnInitDialog() {
+  CDialog::OnInitDialog();
+
+  CString aboutText = fw::LoadString(IDS_ABOUTBOX);
+  HMENU systemMenu = GetSystemMenu(m_hWnd, FALSE);
+  if (!aboutText.empty() && systemMenu != nullptr) {
+    AppendMenuW(systemMenu, MF_SEPARATOR, 0, nullptr);
+    AppendMenuW(systemMenu, MF_STRING, IDM_ABOUTBOX, aboutText.c_str());
+  }
+  // The program icon in the caption and the task bar.
+  SendMessage(WM_SETICON, ICON_BIG, reinterpret_cast<LPARAM>(m_hIcon));
+  SendMessage(WM_SETICON, ICON_SMALL, reinterpret_cast<LPARAM>(m_hIcon));
+
+  LoadTreeImages();
+  // Only the enumerator it keeps matters here: detection asks it which runtimes are present.
+  ListInstalledRuntimeVersions(m_installedProducts);
+  LoadSettings();
+  BuildPageTree();
+  return TRUE;
+}
+
+void CClientAdminDlg::LoadTreeImages() {
+  if (m_imgTree != nullptr) ImageList_Destroy(m_imgTree);
+  m_imgTree = ImageList_Create(16, 16, ILC_COLOR32 | ILC_MASK, 0, 0);
+  if (m_imgTree == nullptr) return;
+  // A missing image is skipped, so the ones after it move up.
+  for (UINT id : {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}) {
+    HBITMAP bitmap = fw::LoadPngBitmap(id, kPngBackground);
+    if (bitmap == nullptr) continue;
+    ImageList_AddMasked(m_imgTree, bitmap, kTreeMaskColor);
+    DeleteObject(bitmap);
+  }
+  TreeView_SetImageList(m_wndTree.m_hWnd, m_imgTree, TVSIL_NORMAL);
+}
+
+void CClientAdminDlg::LoadSettings() {
+  DetectInstalledProducts(m_installedProducts);
+  DWORD storedLanguage = ReadRegistryDword(HKEY_CURRENT_USER, kSettingsKey, kUILangIdValue, kNoStoredLanguage);
+  if (storedLanguage != kNoStoredLanguage) m_dwUILangID = storedLanguage;
+  m_machineSettingsWritable = CanWriteMachineSettings();
+}
+
+void CClientAdminDlg::BuildPageTree() {
+  CClientMaporaConfigDlg& rootPage = GetRootPage();
+  if (m_bPagesCreated) rootPage.DestroyWindow();
+  HWND tree = m_wndTree.m_hWnd;
+  TreeView_DeleteAllItems(tree);
+
+  CString rootText = fw::FormatString(IDS_WORKSTATION_NODE, ComputerName().c_str());
+  TVINSERTSTRUCTW insert = {};
+  insert.hParent = TVI_ROOT;
+  insert.hInsertAfter = TVI_LAST;
+  insert.item.mask = TVIF_TEXT | TVIF_IMAGE | TVIF_SELECTEDIMAGE;
+  insert.item.pszText = &rootText[0];
+  insert.item.iImage = 0;
+  insert.item.iSelectedImage = 0;
+  m_hRootItem = TreeView_InsertItem(tree, &insert);
+
+  // The page places itself beside the tree: its template carries its position.
+  rootPage.m_pAdminDlg = this;
+  rootPage.Create(IDD_MAPORA_CONFIG, this);
+  m_bPagesCreated = true;
+
+  TreeView_Expand(tree, m_hRootItem, TVE_EXPAND);
+  HTREEITEM selectedBefore = TreeView_GetSelection(tree);
+  TreeView_SelectItem(tree, m_hRootItem);
+  // A tree that selected its first item on its own sends no change for it.
+  if (selectedBefore == m_hRootItem && m_hRootItem != nullptr) ShowSelectedPage();
+
+  ::EnableWindow(GetDlgItem(IDC_APPLY_NOW), FALSE);
+  SetHelpFilePath();
+}
+
+void CClientAdminDlg::SetHelpFilePath() {
+  CWinApp* app = AfxGetApp();
+  if (app == nullptr) return;
+  const std::wstring release = GetProductVersion();
+  std::wstring installDir;
+  CString helpPath;
+  if (GetInstallDir(static_cast<int>(ProductKind::Desktop), release, installDir) ||
+      GetInstallDir(static_cast<int>(ProductKind::Engine), release, installDir))
+    helpPath = installDir + L"\\help\\" + kHelpFileName;
+  app->SetHelpFilePath(helpPath);
+}
+
+void CClientAdminDlg::ShowSelectedPage() {
+  HTREEITEM selected = TreeView_GetSelection(m_wndTree.m_hWnd);
+  const bool rootSelected = selected != nullptr && selected == m_hRootItem;
+  CClientMaporaConfigDlg& rootPage = GetRootPage();
+  if (rootPage.m_hWnd != nullptr) rootPage.ShowWindow(rootSelected ? SW_SHOW : SW_HIDE);
+  if (rootSelected) {
+    rootPage.BuildInstallationReport();
+    SetHelpID(IDH_WORKSTATION_PAGE);
+  }
+}
+
+LRESULT CClientAdminDlg::OnTreeSelChanged(WPARAM, LPARAM) {
+  ShowSelectedPage();
+  return 0;
+}
+
+void CClientAdminDlg::EnableApply() { ::EnableWindow(GetDlgItem(IDC_APPLY_NOW), TRUE); }
+
+LRESULT CClientAdminDlg::OnCommandHelp(WPARAM, LPARAM) {
+  UINT helpId = GetHelpID();
+  // The About command's number lies in the help range but has no topic.
+  if (helpId >= IDH_FIRST && helpId <= IDH_LAST && helpId != IDM_ABOUTBOX) {
+    CString helpPath = AfxGetApp() ? AfxGetApp()->GetHelpFilePath() : CString();
+    KVELLocale::KVEL_HtmlHelp(m_hWnd, helpPath.c_str(), HH_DISPLAY_TOPIC, reinterpret_cast<DWORD_PTR>(kHelpTopic));
+  }
+  return TRUE;
+}
+
+LRESULT CClientAdminDlg::OnSysCommand(WPARAM wParam, LPARAM) {
+  if ((wParam & 0xFFF0) == IDM_ABOUTBOX)
+    ShowAboutBox();
+  else
+    Default();
+  return 0;
+}
+
+void CClientAdminDlg::ShowAboutBox() {
+  CAboutDlg about;
+  LoadInstalledServicePack(about);
+  about.DoModal();
+}
+
+bool CClientAdminDlg::Save() {
+  UpdateData(true);
+
+  CString running;
+  if (GetRunningSuiteAppsText(running)) {
+    CString message = fw::FormatString(IDS_APPS_RUNNING_SAVE, running.c_str());
+    CString caption = fw::LoadString(IDS_APP_CAPTION);
+    MessageBoxW(nullptr, message.c_str(), caption.c_str(), MB_OK);
+    return false;
+  }
+
+  // Write failures are not reported: the suite falls back to the user's own language.
+  if (m_dwUILangID != 0) {
+    WriteRegistryDword(kSettingsKey, kUILangIdValue, m_dwUILangID, HKEY_CURRENT_USER);
+  } else {
+    HKEY key = nullptr;
+    if (RegOpenKeyExW(HKEY_CURRENT_USER, kSettingsKey, 0, KEY_SET_VALUE, &key) == ERROR_SUCCESS) {
+      RegDeleteValueW(key, kUILangIdValue);
+      RegCloseKey(key);
+    }
+  }
+  return true;
+}
+
+void CClientAdminDlg::OnOK() {
+  if (Save()) CDialog::OnOK();
+}
+
+LRESULT CClientAdminDlg::OnApply(WPARAM, LPARAM) {
+  if (Save()) ::EnableWindow(GetDlgItem(IDC_APPLY_NOW), FALSE);
+  return 0;
+}
+
+LRESULT CClientAdminDlg::OnDestroy(WPARAM, LPARAM) {
+  KVELLocale::KVEL_HtmlHelp(nullptr, HH_CLOSE_ALL, 0);
+  if (AfxGetApp() != nullptr) AfxGetApp()->SetHelpFilePath(CString());
+  Default();
+  return 0;
+}
+
+LRESULT CClientAdminDlg::OnPaint(WPARAM, LPARAM) {
+  if (!IsIconic(m_hWnd)) {
+    Default();
+    return 0;
+  }
+  PAINTSTRUCT paint;
+  HDC dc = BeginPaint(m_hWnd, &paint);
+  SendMessage(WM_ICONERASEBKGND, reinterpret_cast<WPARAM>(dc), 0);
+  RECT client;
+  GetClientRect(m_hWnd, &client);
+  int x = (client.right - client.left - GetSystemMetrics(SM_CXICON) + 1) / 2;
+  int y = (client.bottom - client.top - GetSystemMetrics(SM_CYICON) + 1) / 2;
+  DrawIcon(dc, x, y, m_hIcon);
+  EndPaint(m_hWnd, &paint);
+  return 0;
+}
+
+LRESULT CClientAdminDlg::OnQueryDragIcon(WPARAM, LPARAM) { return reinterpret_cast<LRESULT>(m_hIcon); }
