@@ -1,15 +1,47 @@
 #include "settings/AdvancedSettings.h"
 
-// Placeholders until the Advanced Configuration dialog lands.
-void PersistAdvancedSettings(CClientAdminDlg&) {}
+#include <commctrl.h>
 
-bool CanWriteMachineSettings() { return false; }
+#include "app/ClientAdminDlg.h"
+#include "app/RunningSuiteApps.h"
+#include "inventory/InstalledProducts.h"
+#include "settings/ClientMaporaAdvancedConfigDlg.h"
+
+namespace {
+
+// Only an administrator may create keys here. The class is one of the suite's own, registered
+// under the standard "controls" category.
+constexpr wchar_t kMachineWriteProbeKey[] =
+    L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}\\Implemented Categories\\"
+    L"{40FC6ED5-2438-11CF-A3DB-080036F12502}";
+
+std::wstring EnableKueiKey(const InstalledProducts& products) { return products.desktopKey + L"\\Settings"; }
+
+// The per-user portal settings key, created when missing; null when it cannot be.
+HKEY OpenConnectionSettings() {
+  HKEY key = nullptr;
+  if (RegCreateKeyExW(HKEY_CURRENT_USER, kConnectionSettingsKey, 0, nullptr, 0, KEY_READ | KEY_WRITE, nullptr, &key,
+                      nullptr) != ERROR_SUCCESS)
+    return nullptr;
+  return key;
+}
+
+void WriteSupportLocalPortal(DWORD supported) {
+  HKEY key = OpenConnectionSettings();
+  if (key == nullptr) return;
+  DWORD value = supported != 0 ? 1 : 0;
+  RegSetValueExW(key, kSupportLocalPortalValue, 0, REG_DWORD, reinterpret_cast<const BYTE*>(&value), sizeof value);
+  RegCloseKey(key);
+}
+
+}  // namespace
 
 DWORD ReadRegistryDword(HKEY root, const std::wstring& keyPath, const std::wstring& valueName, DWORD defaultValue) {
   HKEY key = nullptr;
   if (RegOpenKeyW(root, keyPath.c_str(), &key) != ERROR_SUCCESS) return defaultValue;
   DWORD value = defaultValue;
   DWORD size = sizeof value;
+  // A value longer than the buffer fails with nothing usable in it.
   if (RegQueryValueExW(key, valueName.c_str(), nullptr, nullptr, reinterpret_cast<BYTE*>(&value), &size) !=
       ERROR_SUCCESS)
     value = defaultValue;
@@ -24,4 +56,70 @@ bool WriteRegistryDword(const std::wstring& keyPath, const std::wstring& valueNa
                            sizeof value) == ERROR_SUCCESS;
   RegCloseKey(key);
   return ok;
+}
+
+void DeleteStoredUILangID() {
+  HKEY key = nullptr;
+  if (RegOpenKeyExW(HKEY_CURRENT_USER, kSuiteUserKey, 0, KEY_SET_VALUE, &key) != ERROR_SUCCESS) return;
+  RegDeleteValueW(key, kUILangIDValue);
+  RegCloseKey(key);
+}
+
+void StoreUILangID(DWORD langId) {
+  if (langId != 0)
+    WriteRegistryDword(kSuiteUserKey, kUILangIDValue, langId, HKEY_CURRENT_USER);
+  else
+    DeleteStoredUILangID();
+}
+
+DWORD ReadEnableKuei(const InstalledProducts& products) {
+  return ReadRegistryDword(HKEY_LOCAL_MACHINE, EnableKueiKey(products), kEnableKueiValue, 0);
+}
+
+DWORD ReadSupportLocalPortal() {
+  DWORD value = 0;
+  if (HKEY key = OpenConnectionSettings()) {
+    DWORD size = sizeof value;
+    if (RegQueryValueExW(key, kSupportLocalPortalValue, nullptr, nullptr, reinterpret_cast<BYTE*>(&value), &size) !=
+        ERROR_SUCCESS)
+      value = 0;
+    RegCloseKey(key);
+  }
+  return value == 1 ? 1 : 0;
+}
+
+void PersistAdvancedSettings(CClientAdminDlg& mainDlg) {
+  // The dialog's "Learn More" is a link control, whose class a program registers on demand.
+  INITCOMMONCONTROLSEX controls = {sizeof controls, ICC_LINK_CLASS | ICC_STANDARD_CLASSES};
+  InitCommonControlsEx(&controls);
+
+  CClientMaporaAdvancedConfigDlg dlg(&mainDlg);
+  dlg.m_pMainDlg = &mainDlg;
+  if (dlg.DoModal() == IDOK) {
+    mainDlg.m_dwUILangID = dlg.m_selectedLangId;
+    // An untouched box still holds the raw value, so only a real change is written.
+    const InstalledProducts& products = mainDlg.m_installedProducts;
+    if (dlg.m_enableKuei != ReadEnableKuei(products))
+      WriteRegistryDword(EnableKueiKey(products), kEnableKueiValue, dlg.m_enableKuei, HKEY_LOCAL_MACHINE);
+    WriteSupportLocalPortal(dlg.m_supportLocalPortal);
+  }
+  // Also after Cancel: this rewrites the stored value, or keeps the removal made on opening.
+  StoreUILangID(mainDlg.m_dwUILangID);
+}
+
+bool CanWriteMachineSettings() {
+  // Two rounds of create-or-delete leave the probe key as they found it.
+  for (int round = 0; round < 2; ++round) {
+    HKEY key = nullptr;
+    if (RegOpenKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey, &key) == ERROR_SUCCESS) {
+      RegCloseKey(key);
+      if (RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey) != ERROR_SUCCESS) return false;
+    } else {
+      if (RegCreateKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey, &key) != ERROR_SUCCESS) return false;
+      RegCloseKey(key);
+    }
+  }
+  CStringArray running;
+  GetRunningSuiteApps(running);
+  return running.empty();
 }

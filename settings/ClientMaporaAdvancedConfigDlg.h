@@ -1,0 +1,60 @@
+// "Advanced Configuration": display language, the user experience improvement programme and
+// local-portal support. The dialog only gathers the choices; PersistAdvancedSettings writes them
+// after it closes. The one write while it is open is the removal of a stored display language
+// whose language pack has gone.
+//
+// The "Learn More" link opens <host>/en/knowledgebase/techarticles/detail/38987, where <host> is
+// the REG_SZ value
+//   HKEY_LOCAL_MACHINE\SOFTWARE\KVEL\Mapora Administrator  "Support Site"
+// (scheme and host, no trailing slash), https://support.kvel.example when it is missing or empty.
+#pragma once
+
+#include <windows.h>
+
+#include "framework/Dialog.h"
+
+class CClientAdminDlg;
+
+inline constexpr wchar_t kAdministratorMachineKey[] = L"SOFTWARE\\KVEL\\Mapora Administrator";
+inline constexpr wchar_t kSupportSiteValue[] = L"Support Site";
+inline constexpr wchar_t kDefaultSupportSite[] = L"https://support.kvel.example";
+inline constexpr wchar_t kLearnMorePath[] = L"/en/knowledgebase/techarticles/detail/38987";
+
+class CClientMaporaAdvancedConfigDlg : public CDialog {
+ public:
+  explicit CClientMaporaAdvancedConfigDlg(CWnd* parent = nullptr);
+
+  // The address behind "Learn More".
+  static CString LearnMoreAddress();
+
+  CClientAdminDlg* m_pMainDlg = nullptr;  // set by the creator before the dialog is shown
+  DWORD m_selectedLangId = 0;             // item data of the selected language entry
+  DWORD m_enableKuei = 0;                 // raw EnableKUEI until the box is clicked, then 0 or 1
+  DWORD m_supportLocalPortal = 0;         // 0 or 1
+  bool m_languagesListed = false;
+  bool m_languagePackFound = false;  // a pack matches the Windows UI language
+  CString m_uiLocaleName;            // "en-US", or "en" once a language-only pack was seen
+
+ protected:
+  void DoDataExchange(CDataExchange* pDX) override;
+  BOOL OnInitDialog() override;
+  const MessageMap* GetMessageMap() const override;
+
+ private:
+  void BuildLanguageList();
+  void CollectLanguagePacks();
+  void ScanLanguagePackFolder(const CString& pattern);
+  void AddLanguageEntry(DWORD langId);
+  void SelectCurrentLanguage();
+  void UpdateLanguageWarning();
+  int AppendLanguage(const CString& text, DWORD langId);
+
+  LRESULT OnLanguageSelChange(WPARAM wParam, LPARAM lParam);
+  LRESULT OnKueiClicked(WPARAM wParam, LPARAM lParam);
+  LRESULT OnLocalPortalClicked(WPARAM wParam, LPARAM lParam);
+  LRESULT OnLearnMore(WPARAM wParam, LPARAM lParam);
+  LRESULT OnManagePortals(WPARAM wParam, LPARAM lParam);
+  LRESULT OnCtlColorWarning(WPARAM wParam, LPARAM lParam);
+
+  CWnd m_languageList;
+};
