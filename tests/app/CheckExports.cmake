@@ -2,7 +2,7 @@
 # Fails unless the program is a GUI program whose export table carries every operation that the
 # header declares (each overload counted).
 string(REGEX REPLACE "objdump$" "c++filt" CXXFILT "${OBJDUMP}")
-execute_process(COMMAND ${OBJDUMP} -p ${EXE} COMMAND ${CXXFILT}
+execute_process(COMMAND ${OBJDUMP} -p ${EXE} COMMAND ${CXXFILT} -n
                 OUTPUT_VARIABLE dump RESULT_VARIABLE failed)
 if(failed)
   message(FATAL_ERROR "cannot read ${EXE} with ${OBJDUMP} and ${CXXFILT}")
