@@ -33,9 +33,18 @@ case "$cmd" in
     mkdir -p "$WINEPREFIX"
     wineserver -p </dev/null >/dev/null 2>&1
     wineboot -i </dev/null >/dev/null 2>&1
+    # Wine's own fonts (Tahoma, Marlett for the caption buttons, ...) are not put into new
+    # prefixes by this Wine build; without them dialogs fall back to other faces.
+    tools_dir=$(dirname "$0")
+    "$tools_dir/wine-fonts.sh" "$WINEPREFIX"
     # A virtual desktop draws Windows' own window frames, so screenshots look like Windows.
     wine reg add 'HKCU\Software\Wine\Explorer' /v Desktop /d Default /f </dev/null >/dev/null 2>&1
     wine reg add 'HKCU\Software\Wine\Explorer\Desktops' /v Default /d 1024x768 /f </dev/null >/dev/null 2>&1
+    # The desktop that wineboot opened predates those settings: start the session over so the
+    # first window opens the virtual desktop.
+    wineserver -k; wineserver -w
+    wineserver -p </dev/null >/dev/null 2>&1
+    wine cmd /c exit </dev/null >/dev/null 2>&1
     echo "Wine prefix ready: $WINEPREFIX on display :$num"
     ;;
   stop) stop ;;
