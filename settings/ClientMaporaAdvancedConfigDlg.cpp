@@ -34,9 +34,12 @@ bool GetLocaleText(LCID locale, LCTYPE type, CString& text) {
   return true;
 }
 
-// The native country name, only for a locale the system supports as a whole.
+// The native country name, only for a locale the system supports as a whole. A language without
+// a country (sub-language 0, as a "de" pack names it) is never one, although some systems'
+// IsValidLocale accept it and then report the language's main country.
 bool GetNativeCountry(LANGID langId, CString& country) {
-  return IsValidLocale(langId, LCID_SUPPORTED) && GetLocaleText(langId, LOCALE_SNATIVECTRYNAME, country);
+  return SUBLANGID(langId) != SUBLANG_NEUTRAL && IsValidLocale(langId, LCID_SUPPORTED) &&
+         GetLocaleText(langId, LOCALE_SNATIVECTRYNAME, country);
 }
 
 }  // namespace
