@@ -11,6 +11,8 @@ packages=(
   wine wine64
   xvfb xauth x11-utils imagemagick
   fp-utils
+  # Japanese and Chinese glyphs for the language packs under Wine (its own Tahoma has Arabic)
+  fonts-vlgothic fonts-wqy-microhei
 )
 
 missing=()
