@@ -182,6 +182,17 @@ class PortalManagerButton : public testing::Test {
   ScopedRegistryKey classKey{HKEY_CLASSES_ROOT, L"CLSID\\{9A1D3B36-B085-4005-9041-9D70EC893EC8}"};
 };
 
+// Closes the box with the given caption once it shows, keeping the texts it showed.
+std::function<bool()> CloseBox(std::wstring caption, std::wstring& texts) {
+  return [caption, &texts] {
+    HWND box = settings_tests::FindOwnWindow(caption);
+    if (box == nullptr) return false;
+    texts = settings_tests::ChildTexts(box);
+    PostMessageW(box, WM_COMMAND, IDOK, 0);
+    return true;
+  };
+}
+
 TEST_F(PortalManagerButton, ShowsTheManagersWindow) {
   HMODULE server = LoadLibraryW((testing_support::ModuleFolder() + L"\\PortalManager.dll").c_str());
   ASSERT_NE(server, nullptr);
@@ -192,13 +203,7 @@ TEST_F(PortalManagerButton, ShowsTheManagersWindow) {
 
   OpenDialog dlg(ws.mainDlg);
   std::wstring shown;
-  WhileModal close([&] {
-    HWND box = settings_tests::FindOwnWindow(L"Portal Connections");
-    if (box == nullptr) return false;
-    shown = settings_tests::ChildTexts(box);
-    PostMessageW(box, WM_COMMAND, IDOK, 0);
-    return true;
-  });
+  WhileModal close(CloseBox(L"Portal Connections", shown));
   Click(dlg.m_hWnd, IDC_MANAGE_PORTALS);
   EXPECT_NE(shown.find(L"No portal connections"), std::wstring::npos) << shown;
 }
@@ -208,13 +213,7 @@ TEST_F(PortalManagerButton, ClassThatCannotBeCreatedReachesTheApplicationsReport
   CWinApp app;
   OpenDialog dlg(ws.mainDlg);
   std::wstring report;
-  WhileModal close([&] {
-    HWND box = settings_tests::FindOwnWindow(app.GetAppName());
-    if (box == nullptr) return false;
-    report = settings_tests::ChildTexts(box);
-    PostMessageW(box, WM_COMMAND, IDOK, 0);
-    return true;
-  });
+  WhileModal close(CloseBox(app.GetAppName(), report));
   Click(dlg.m_hWnd, IDC_MANAGE_PORTALS);
   EXPECT_NE(report.find(L"The operation could not be completed."), std::wstring::npos) << report;
   EXPECT_NE(report.find(L"0x80040154"), std::wstring::npos) << report;  // class not registered
