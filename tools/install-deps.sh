@@ -8,7 +8,7 @@ packages=(
   g++-mingw-w64-i686-posix g++-mingw-w64-x86-64-posix
   binutils-mingw-w64-i686 binutils-mingw-w64-x86-64
   googletest
-  wine wine64
+  wine wine64 fonts-wine
   xvfb xauth x11-utils imagemagick
   fp-utils
   # Japanese and Chinese glyphs for the language packs under Wine (its own Tahoma has Arabic)
