@@ -5,12 +5,65 @@
 
 namespace KVELLocale {
 
+// Sizes of the fixed text fields of the locale state, in wide characters.
+constexpr int kLocaleNameChars = 85;
+constexpr int kLocalePathChars = MAX_PATH;
+
+constexpr LANGID kEnglishUS = 0x0409;
+constexpr LANGID kEnglishNeutral = 0x0009;
+
+// The process-wide locale record: zero at load, filled once by InitLocale, never freed.
+// Exported string results point into it.
+struct LocaleState {
+  unsigned short langId;
+  unsigned short countryId;
+  wchar_t langName[kLocaleNameChars];
+  wchar_t countryName[kLocaleNameChars];
+  wchar_t langDir[kLocalePathChars];         // kept for callers outside the library
+  wchar_t langCountryDir[kLocalePathChars];  // likewise
+  unsigned short uiLangId;
+  unsigned short uiCountryId;
+  wchar_t uiLangName[kLocaleNameChars];
+  wchar_t uiCountryName[kLocaleNameChars];
+  wchar_t uiLangDir[kLocalePathChars];
+  wchar_t uiLangCountryDir[kLocalePathChars];
+  bool overridePending;
+  bool rtlLanguageKnown, rtlLanguage;
+  bool rtlKnown, rtl;
+  // Scratch of the locale enumeration: a non-zero enumLangId selects by-identifier mode.
+  bool enumFound;
+  unsigned short enumLangId, enumCountryId;
+  const wchar_t* enumName;  // not owned; only valid during one enumeration
+};
+
+extern LocaleState g_localeState;
+
 // Computes the process-wide state once; later calls return at once.
 void InitLocale();
+// Decides the UI language and its language-pack folders (part of InitLocale).
+void InitUILocale();
+// The UI language from the stored choice or the user's default; sets the thread's UI language.
+LANGID DetermineUILangID();
+// The stored UI language choice (UILANGID, or Q4-UILANGID for q4.exe); 0 when there is none.
+LANGID ReadStoredUILangID();
 // True when some supported system locale shares the primary language of langId. Not re-entrant.
 bool IsValidLangID(unsigned short langId);
 // Maps a language-pack folder name ("de" -> 0x0007, "de-DE" -> 0x0407) to a LANGID.
 // langId is 0 unless a supported locale matches. Not re-entrant.
 bool GetLangIDFromName(const wchar_t* name, unsigned short& langId);
+// <Common Files>\Mapora, where language packs and help live; "" when the shell folder is
+// unknown, which leaves the folders below it relative.
+void GetSuiteFolder(wchar_t (&folder)[kLocalePathChars]);
+// Reads a value of HKCU\Software\KVEL (read-only) into buffer; false when it cannot be read
+// or does not fit.
+bool QuerySettingsValue(const wchar_t* valueName, void* buffer, DWORD size);
+// A right-to-left switch under HKCU\Software\KVEL: false for left-to-right UI languages,
+// otherwise true unless the value reads "false"; defaultValue when it cannot be read.
+bool ReadRTLSetting(const wchar_t* valueName, bool defaultValue);
+// Callback of EnumSystemLocalesW serving IsValidLangID and GetLangIDFromName.
+BOOL CALLBACK EnumLocalesProc(LPWSTR localeString);
+
+// Calls the HTML Help control's HtmlHelpW; null when the control cannot be loaded.
+HWND CallHtmlHelp(HWND window, const wchar_t* file, UINT command, DWORD_PTR data);
 
 }  // namespace KVELLocale
