@@ -10,10 +10,10 @@ cd "$(dirname "$0")/.."
 # Before the long part: without a display nothing can be shown.
 workstation/workstation.sh check-display
 tools/install-deps.sh
-jobs=$(nproc)
 cmake --preset x86 >/dev/null
-cmake --build --preset x86 -j "$jobs"
+cmake --build --preset x86 -j "$(nproc)"
+# Of the x64 tree only what the workstation takes; tools/test.sh builds the tests.
 cmake --preset x64 >/dev/null
-cmake --build --preset x64 -j "$jobs"
+cmake --build --preset x64 -j "$(nproc)" --target workstation
 workstation/workstation.sh provision build/x64
 exec workstation/workstation.sh open "$@"

@@ -15,7 +15,8 @@
 # To add a step, write a function step_<name> beside the others, using the paths of "Workstation
 # layout" and the helpers below, and add <name> to STEPS where it has to run (after "prefix"; a
 # step that needs the products installed goes after "products"). Put its data files in this
-# folder, and build anything it needs from workstation/CMakeLists.txt so it lands in BUILD_DIR.
+# folder; a built file it needs must be made by the target "workstation" (workstation/CMakeLists.txt),
+# which tools/run.sh builds.
 set -euo pipefail
 
 here=$(cd "$(dirname "$0")" && pwd)
