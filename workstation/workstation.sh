@@ -39,7 +39,7 @@ CONSOLE_EXE="$CONSOLE_DIR\\MaporaAdmin.exe"
 # Where the stand-ins of suite components that the console talks to are installed.
 STANDINS_DIR="$COMMON_FILES\\Kvel\\bin"
 
-STEPS=(prefix virtual_desktop fonts products runtime_info console)
+STEPS=(prefix virtual_desktop fonts products runtime_info portal_manager console)
 
 # --- Helpers ----------------------------------------------------------------------------------
 die() { echo "workstation: $*" >&2; exit 1; }
@@ -105,14 +105,10 @@ REGEDIT4
 EOF
 }
 
-# Wine's own fonts (Marlett draws the caption buttons), which Debian ships beside Wine without
-# putting them into new prefixes.
+# Wine's own fonts (Marlett draws the caption buttons), which this Wine build does not put into
+# new prefixes.
 step_fonts() {
-  local font
-  for font in /usr/share/wine/fonts/*.ttf; do
-    [ -f "$font" ] && install_file "$font" "C:\\windows\\Fonts\\$(basename "$font")"
-  done
-  return 0
+  "$root/tools/wine-fonts.sh" "$WINEPREFIX"
 }
 
 # Installation records, the Desktop installation marker and each product's core library.
@@ -129,6 +125,12 @@ step_runtime_info() {
   wine_quiet regsvr32 /s "$STANDINS_DIR\\SuiteRuntimeInfo.dll" || die "regsvr32 SuiteRuntimeInfo.dll failed"
   wine_quiet reg add 'HKLM\SOFTWARE\KVEL\RuntimeInfo' /v Runtimes /t REG_MULTI_SZ \
     /d '1 10.5 Desktop runtime\02 10.5 Engine runtime' /f || die "could not configure the runtime list"
+}
+
+# The portal connection manager (our stand-in) behind "Manage Portal Connections...".
+step_portal_manager() {
+  install_file "$(built standins/portal-manager/PortalManager.dll)" "$STANDINS_DIR\\PortalManager.dll"
+  wine_quiet regsvr32 /s "$STANDINS_DIR\\PortalManager.dll" || die "regsvr32 PortalManager.dll failed"
 }
 
 step_console() {

@@ -36,27 +36,6 @@ std::wstring Joined(const std::vector<std::wstring>& texts) {
   return all;
 }
 
-// Wine draws the caption buttons with Marlett, which Debian ships beside Wine but does not put into
-// new prefixes; without it the screenshots show letters in place of the buttons.
-class CaptionButtonFont : public ::testing::Environment {
- public:
-  void SetUp() override {
-    wchar_t windows[MAX_PATH] = L"";
-    GetWindowsDirectoryW(windows, MAX_PATH);
-    target_ = std::wstring(windows) + L"\\Fonts\\marlett.ttf";
-    installed_ = CopyFileW(WindowsPath("/usr/share/wine/fonts/marlett.ttf").c_str(), target_.c_str(), TRUE) != FALSE;
-  }
-  void TearDown() override {
-    if (installed_) DeleteFileW(target_.c_str());
-  }
-
- private:
-  std::wstring target_;
-  bool installed_ = false;
-};
-
-const ::testing::Environment* const kCaptionButtonFont = ::testing::AddGlobalTestEnvironment(new CaptionButtonFont);
-
 // ---------------------------------------------------------------------------------------------
 
 TEST(ConsoleWindow, ShowsTitleAndSelectedWorkstationNode) {
