@@ -39,7 +39,7 @@ CONSOLE_EXE="$CONSOLE_DIR\\MaporaAdmin.exe"
 # Where the stand-ins of suite components that the console talks to are installed.
 STANDINS_DIR="$COMMON_FILES\\Kvel\\bin"
 
-STEPS=(prefix virtual_desktop fonts products runtime_info portal_manager console)
+STEPS=(prefix virtual_desktop fonts products runtime_info portal_manager console language_packs)
 
 # --- Helpers ----------------------------------------------------------------------------------
 die() { echo "workstation: $*" >&2; exit 1; }
@@ -135,6 +135,30 @@ step_portal_manager() {
 
 step_console() {
   install_file "$(built app/MaporaAdmin.exe)" "$CONSOLE_EXE"
+}
+
+# The console's language packs where it loads them, <Common Files>\Mapora\bin\<tag> as the 64-bit
+# and the 32-bit console see it, and in the products' bin folders, which Advanced Configuration
+# lists; the help file in the Desktop product's help folder with its French translation. The
+# Japanese and Chinese dialogs ask for faces Wine lacks, and its bold caption font falls back to
+# no CJK font: both are pointed at the CJK fonts that tools/install-deps.sh installs.
+step_language_packs() {
+  local pack tag dir help=administering_mapora_desktop.chm
+  for pack in "$BUILD"/packs/*/ResMaporaAdmin.dll; do
+    [ -f "$pack" ] || die "$BUILD/packs holds no language pack; build the x64 tree first"
+    tag=$(basename "$(dirname "$pack")")
+    for dir in "$COMMON_FILES\\Mapora" "$COMMON_FILES_X86\\Mapora" "$DESKTOP_DIR" "$ENGINE_DIR"; do
+      install_file "$pack" "$dir\\bin\\$tag\\ResMaporaAdmin.dll"
+    done
+  done
+  install_file "$(built "help-files/$help")" "$DESKTOP_DIR\\help\\$help"
+  install_file "$(built "help-files/fr/$help")" "$DESKTOP_DIR\\help\\fr\\$help"
+  local replacements='HKCU\Software\Wine\Fonts\Replacements'
+  local links='HKLM\Software\Microsoft\Windows NT\CurrentVersion\FontLink\SystemLink'
+  wine_quiet reg add "$replacements" /v 'Meiryo UI' /d 'VL PGothic' /f &&
+    wine_quiet reg add "$replacements" /v SimSun /d 'WenQuanYi Micro Hei' /f &&
+    wine_quiet reg add "$links" /v 'Tahoma Bold' /t REG_MULTI_SZ /d 'wqy-microhei.ttc,WenQuanYi Micro Hei' /f ||
+    die "could not map the CJK fonts"
 }
 
 # --- Commands ---------------------------------------------------------------------------------
