@@ -9,12 +9,9 @@
 #include <vector>
 
 #include "inventory/SuiteRuntimeEnumerator.h"
+#include "standins/InprocServer.h"
 
 namespace {
-
-HMODULE g_module = nullptr;
-LONG g_liveObjects = 0;
-LONG g_serverLocks = 0;
 
 struct RuntimeEntry {
   bool valid = false;
@@ -69,12 +66,10 @@ std::vector<RuntimeEntry> ReadConfiguredRuntimes() {
 
 // Reference counting and the server's object count, shared by the two component objects.
 template <class Interface>
-class ComObject : public Interface {
+class ComObject : public Interface, private inproc_server::LiveObject {
  public:
-  ComObject() { InterlockedIncrement(&g_liveObjects); }
-  virtual ~ComObject() { InterlockedDecrement(&g_liveObjects); }
-  ComObject(const ComObject&) = delete;
-  ComObject& operator=(const ComObject&) = delete;
+  ComObject() = default;
+  virtual ~ComObject() = default;
 
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
     if (object == nullptr) return E_POINTER;
@@ -143,95 +138,24 @@ class RuntimeInfo : public ComObject<ISuiteRuntimeInfo> {
   const IID& InterfaceId() const override { return IID_ISuiteRuntimeInfo; }
 };
 
-// The one class factory lives as long as the module; its references do not keep it alive.
-class RuntimeInfoFactory : public IClassFactory {
- public:
-  HRESULT STDMETHODCALLTYPE QueryInterface(REFIID riid, void** object) override {
-    if (object == nullptr) return E_POINTER;
-    *object = nullptr;
-    if (!IsEqualIID(riid, IID_IUnknown) && !IsEqualIID(riid, IID_IClassFactory)) return E_NOINTERFACE;
-    *object = static_cast<IClassFactory*>(this);
-    return S_OK;
-  }
-  ULONG STDMETHODCALLTYPE AddRef() override { return 2; }
-  ULONG STDMETHODCALLTYPE Release() override { return 1; }
-
-  HRESULT STDMETHODCALLTYPE CreateInstance(IUnknown* outer, REFIID riid, void** object) override {
-    if (object == nullptr) return E_POINTER;
-    *object = nullptr;
-    if (outer != nullptr) return CLASS_E_NOAGGREGATION;
-    RuntimeInfo* info = new RuntimeInfo();
-    HRESULT hr = info->QueryInterface(riid, object);
-    info->Release();
-    return hr;
-  }
-  HRESULT STDMETHODCALLTYPE LockServer(BOOL lock) override {
-    if (lock)
-      InterlockedIncrement(&g_serverLocks);
-    else
-      InterlockedDecrement(&g_serverLocks);
-    return S_OK;
-  }
-};
-
-RuntimeInfoFactory g_factory;
-
-std::wstring ClassKeyPath() {
-  wchar_t clsid[40] = L"";
-  StringFromGUID2(CLSID_SuiteRuntimeInfo, clsid, 40);
-  return std::wstring(L"CLSID\\") + clsid;
-}
-
-LONG SetStringValue(HKEY key, const wchar_t* name, const std::wstring& value) {
-  return RegSetValueExW(key, name, 0, REG_SZ, reinterpret_cast<const BYTE*>(value.c_str()),
-                        static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
-}
-
 }  // namespace
 
 BOOL WINAPI DllMain(HINSTANCE module, DWORD reason, LPVOID) {
   if (reason == DLL_PROCESS_ATTACH) {
-    g_module = module;
+    inproc_server::g_module = module;
     DisableThreadLibraryCalls(module);
   }
   return TRUE;
 }
 
 STDAPI DllGetClassObject(REFCLSID rclsid, REFIID riid, LPVOID* object) {
-  if (object == nullptr) return E_POINTER;
-  *object = nullptr;
-  if (!IsEqualCLSID(rclsid, CLSID_SuiteRuntimeInfo)) return CLASS_E_CLASSNOTAVAILABLE;
-  return g_factory.QueryInterface(riid, object);
+  return inproc_server::GetClassObject<RuntimeInfo>(CLSID_SuiteRuntimeInfo, rclsid, riid, object);
 }
 
-STDAPI DllCanUnloadNow() { return g_liveObjects == 0 && g_serverLocks == 0 ? S_OK : S_FALSE; }
+STDAPI DllCanUnloadNow() { return inproc_server::CanUnloadNow(); }
 
 STDAPI DllRegisterServer() {
-  wchar_t path[MAX_PATH] = L"";
-  DWORD length = GetModuleFileNameW(g_module, path, MAX_PATH);
-  if (length == 0 || length >= MAX_PATH) return SELFREG_E_CLASS;
-
-  const std::wstring classKey = ClassKeyPath();
-  HKEY key = nullptr;
-  if (RegCreateKeyExW(HKEY_CLASSES_ROOT, (classKey + L"\\InprocServer32").c_str(), 0, nullptr, 0, KEY_SET_VALUE,
-                      nullptr, &key, nullptr) != ERROR_SUCCESS)
-    return SELFREG_E_CLASS;
-  LONG status = SetStringValue(key, nullptr, path);
-  if (status == ERROR_SUCCESS) status = SetStringValue(key, L"ThreadingModel", L"Apartment");
-  RegCloseKey(key);
-  if (status == ERROR_SUCCESS &&
-      RegOpenKeyExW(HKEY_CLASSES_ROOT, classKey.c_str(), 0, KEY_SET_VALUE, &key) == ERROR_SUCCESS) {
-    status = SetStringValue(key, nullptr, L"Suite runtime information (stand-in)");
-    RegCloseKey(key);
-  }
-  if (status != ERROR_SUCCESS) {
-    RegDeleteTreeW(HKEY_CLASSES_ROOT, classKey.c_str());
-    return SELFREG_E_CLASS;
-  }
-  return S_OK;
+  return inproc_server::RegisterServer(CLSID_SuiteRuntimeInfo, L"Suite runtime information (stand-in)");
 }
 
-STDAPI DllUnregisterServer() {
-  LONG status = RegDeleteTreeW(HKEY_CLASSES_ROOT, ClassKeyPath().c_str());
-  return status == ERROR_SUCCESS || status == ERROR_FILE_NOT_FOUND ? S_OK : SELFREG_E_CLASS;
-}
+STDAPI DllUnregisterServer() { return inproc_server::UnregisterServer(CLSID_SuiteRuntimeInfo); }
