@@ -17,8 +17,6 @@
 
 namespace {
 
-const wchar_t kSettingsKey[] = L"SOFTWARE\\KVEL";
-const wchar_t kUILangIdValue[] = L"UILANGID";
 constexpr DWORD kNoStoredLanguage = 0xFFFFFFFF;
 
 const wchar_t kHelpFileName[] = L"administering_mapora_desktop.chm";
@@ -108,7 +106,7 @@ void CClientAdminDlg::LoadTreeImages() {
 
 void CClientAdminDlg::LoadSettings() {
   DetectInstalledProducts(m_installedProducts);
-  DWORD storedLanguage = ReadRegistryDword(HKEY_CURRENT_USER, kSettingsKey, kUILangIdValue, kNoStoredLanguage);
+  DWORD storedLanguage = ReadRegistryDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue, kNoStoredLanguage);
   if (storedLanguage != kNoStoredLanguage) m_dwUILangID = storedLanguage;
   m_machineSettingsWritable = CanWriteMachineSettings();
 }
@@ -210,15 +208,7 @@ bool CClientAdminDlg::Save() {
   }
 
   // Write failures are not reported: the suite falls back to the user's own language.
-  if (m_dwUILangID != 0) {
-    WriteRegistryDword(kSettingsKey, kUILangIdValue, m_dwUILangID, HKEY_CURRENT_USER);
-  } else {
-    HKEY key = nullptr;
-    if (RegOpenKeyExW(HKEY_CURRENT_USER, kSettingsKey, 0, KEY_SET_VALUE, &key) == ERROR_SUCCESS) {
-      RegDeleteValueW(key, kUILangIdValue);
-      RegCloseKey(key);
-    }
-  }
+  StoreUILangID(m_dwUILangID);
   return true;
 }
 
