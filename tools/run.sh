@@ -7,9 +7,9 @@
 # build; the i686 build (build/x86) is the shipped product and is built alongside.
 set -euo pipefail
 cd "$(dirname "$0")/.."
-# Before the long part: without a display nothing can be shown.
-workstation/workstation.sh check-display
 tools/install-deps.sh
+# Before the long part: without a display nothing can be shown (xvfb-run is installed by now).
+workstation/workstation.sh check-display
 cmake --preset x86 >/dev/null
 cmake --build --preset x86 -j "$(nproc)"
 # Of the x64 tree only what the workstation takes; tools/test.sh builds the tests.
