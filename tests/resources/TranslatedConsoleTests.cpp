@@ -123,7 +123,10 @@ class TranslatedConsole : public testing::TestWithParam<ConsoleCase> {
 
 TEST_P(TranslatedConsole, ShowsThePackAndOpensItsHelp) {
   const ConsoleCase& c = GetParam();
-  Console console({c.arguments, {L"KVEL_DESKTOP10.5_INSTALLED=1"}});
+  LaunchOptions options;
+  options.arguments = c.arguments;
+  options.environment = {L"KVEL_DESKTOP10.5_INSTALLED=1"};
+  Console console(options);
   HWND mainWindow = console.WaitForMainWindow();
   ASSERT_NE(mainWindow, nullptr);
 
