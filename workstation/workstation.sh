@@ -105,8 +105,7 @@ REGEDIT4
 EOF
 }
 
-# Wine's own fonts (Marlett draws the caption buttons), which this Wine build does not put into
-# new prefixes.
+# Wine's own fonts, which this Wine build does not put into new prefixes, and the CJK font mapping.
 step_fonts() {
   "$root/tools/wine-fonts.sh" "$WINEPREFIX"
 }
@@ -139,9 +138,7 @@ step_console() {
 
 # The console's language packs where it loads them, <Common Files>\Mapora\bin\<tag> as the 64-bit
 # and the 32-bit console see it, and in the products' bin folders, which Advanced Configuration
-# lists; the help file in the Desktop product's help folder with its French translation. The
-# Japanese and Chinese dialogs ask for faces Wine lacks, and its bold caption font falls back to
-# no CJK font: both are pointed at the CJK fonts that tools/install-deps.sh installs.
+# lists; the help file in the Desktop product's help folder with its French translation.
 step_language_packs() {
   local pack tag dir help=administering_mapora_desktop.chm
   for pack in "$BUILD"/packs/*/ResMaporaAdmin.dll; do
@@ -153,12 +150,6 @@ step_language_packs() {
   done
   install_file "$(built "help-files/$help")" "$DESKTOP_DIR\\help\\$help"
   install_file "$(built "help-files/fr/$help")" "$DESKTOP_DIR\\help\\fr\\$help"
-  local replacements='HKCU\Software\Wine\Fonts\Replacements'
-  local links='HKLM\Software\Microsoft\Windows NT\CurrentVersion\FontLink\SystemLink'
-  wine_quiet reg add "$replacements" /v 'Meiryo UI' /d 'VL PGothic' /f &&
-    wine_quiet reg add "$replacements" /v SimSun /d 'WenQuanYi Micro Hei' /f &&
-    wine_quiet reg add "$links" /v 'Tahoma Bold' /t REG_MULTI_SZ /d 'wqy-microhei.ttc,WenQuanYi Micro Hei' /f ||
-    die "could not map the CJK fonts"
 }
 
 # --- Commands ---------------------------------------------------------------------------------
