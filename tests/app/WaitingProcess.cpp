@@ -8,13 +8,7 @@
 int main(int argc, char** argv) {
   if (argc != 4) return 2;
   HANDLE parent = OpenProcess(SYNCHRONIZE, FALSE, std::strtoul(argv[2], nullptr, 10));
-  HANDLE started = OpenSemaphoreA(SEMAPHORE_MODIFY_STATE, FALSE, argv[1]);
-  if (started) {
-    ReleaseSemaphore(started, 1, nullptr);
-    CloseHandle(started);
-  }
-  if (parent == nullptr) return 1;
-  WaitForSingleObject(parent, std::strtoul(argv[3], nullptr, 10));
-  CloseHandle(parent);
-  return 0;
+  if (HANDLE started = OpenSemaphoreA(SEMAPHORE_MODIFY_STATE, FALSE, argv[1])) ReleaseSemaphore(started, 1, nullptr);
+  if (parent) WaitForSingleObject(parent, std::strtoul(argv[3], nullptr, 10));
+  return parent ? 0 : 1;
 }
