@@ -79,20 +79,33 @@ struct WindowSearch {
   std::vector<HWND> found;
 };
 
+// Enumeration callbacks are named functions: on 32-bit x86 a lambda does not convert to the
+// stdcall pointer the enumerators take.
+BOOL CALLBACK CollectProcessDialog(HWND window, LPARAM param) {
+  auto* s = reinterpret_cast<WindowSearch*>(param);
+  DWORD owner = 0;
+  GetWindowThreadProcessId(window, &owner);
+  if (owner == s->processId && IsWindowVisible(window) && ClassName(window) == L"#32770") s->found.push_back(window);
+  return TRUE;
+}
+
 // Visible top-level dialog windows of a process, in z order (topmost first).
 std::vector<HWND> ProcessDialogs(DWORD processId) {
   WindowSearch search{processId, {}};
-  EnumWindows(
-      [](HWND window, LPARAM param) -> BOOL {
-        auto* s = reinterpret_cast<WindowSearch*>(param);
-        DWORD owner = 0;
-        GetWindowThreadProcessId(window, &owner);
-        if (owner == s->processId && IsWindowVisible(window) && ClassName(window) == L"#32770")
-          s->found.push_back(window);
-        return TRUE;
-      },
-      reinterpret_cast<LPARAM>(&search));
+  EnumWindows(CollectProcessDialog, reinterpret_cast<LPARAM>(&search));
   return search.found;
+}
+
+struct ControlSearch {
+  int id;
+  HWND found;
+};
+
+BOOL CALLBACK FindControl(HWND child, LPARAM param) {
+  auto* s = reinterpret_cast<ControlSearch*>(param);
+  if (GetDlgCtrlID(child) != s->id) return TRUE;
+  s->found = child;
+  return FALSE;
 }
 
 }  // namespace
@@ -147,14 +160,17 @@ bool ChildProcess::WaitForExit(DWORD timeoutMs) const {
 
 void ChildProcess::Terminate() {
   if (Running()) {
-      TerminateProcess(process_, 1);
+    TerminateProcess(process_, 1);
     WaitForSingleObject(process_, kWaitMs);
-    }
+  }
 }
 
 std::wstring ConsolePath() { return WindowsPath(MAPORA_CONSOLE_EXE); }
 
-Console::Console(const LaunchOptions& options) : ChildProcess(ConsolePath(), options.arguments, options.environment) {}
+Console::Console(const LaunchOptions& options) : Console(options, ConsolePath()) {}
+
+Console::Console(const LaunchOptions& options, const std::wstring& program)
+    : ChildProcess(program, options.arguments, options.environment) {}
 
 HWND Console::WaitForMainWindow(DWORD timeoutMs) {
   WaitUntil(
@@ -201,6 +217,12 @@ std::wstring ClassName(HWND window) {
 }
 
 HWND Control(HWND dialog, int id) { return GetDlgItem(dialog, id); }
+
+HWND Descendant(HWND window, int id) {
+  ControlSearch search{id, nullptr};
+  EnumChildWindows(window, FindControl, reinterpret_cast<LPARAM>(&search));
+  return search.found;
+}
 
 void Click(HWND dialog, int id) { PostMessageW(Control(dialog, id), BM_CLICK, 0, 0); }
 

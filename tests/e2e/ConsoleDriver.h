@@ -55,6 +55,8 @@ struct LaunchOptions {
 class Console : public ChildProcess {
  public:
   explicit Console(const LaunchOptions& options = {});
+  // A copy of the console elsewhere, such as in the suite's shared program folder.
+  Console(const LaunchOptions& options, const std::wstring& program);
 
   // The main window (the dialog with the page tree) once it is shown; null after the timeout.
   HWND WaitForMainWindow(DWORD timeoutMs = kWaitMs);
@@ -73,6 +75,8 @@ std::wstring ConsolePath();
 std::wstring WindowText(HWND window);
 std::wstring ClassName(HWND window);
 HWND Control(HWND dialog, int id);
+// The first descendant with the control identifier id, such as a control of a page.
+HWND Descendant(HWND window, int id);
 // Presses a button of a dialog without waiting for what the press does.
 void Click(HWND dialog, int id);
 // The non-empty texts of a dialog's static controls, in tab order.
