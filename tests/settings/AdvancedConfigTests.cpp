@@ -1,222 +1,176 @@
-// The Advanced Configuration dialog's other settings: their initial states, what Save and
-// Cancel write, the machine-settings probe and the portal connection manager button.
+// The Advanced Configuration dialog, run as the workstation page runs it, and the machine-settings probe.
 #include <gtest/gtest.h>
 
-#include <ole2.h>
+#include <algorithm>
+#include <functional>
+#include <utility>
 
-#include <optional>
-
-#include "framework/App.h"
+#include "app/ClientAdminDlg.h"
 #include "res/resource.h"
 #include "settings/AdvancedSettings.h"
-#include "settings/PortalConnectionManager.h"
-#include "tests/settings/SettingsTestSupport.h"
-
-using settings_tests::Click;
-using settings_tests::OpenDialog;
-using settings_tests::WhileModal;
-using settings_tests::Workstation;
-using testing_support::ReadDword;
-using testing_support::ScopedRegistryKey;
+#include "settings/URLTokenManager.h"
+#include "tests/support/TestSupport.h"
 
 namespace {
 
-constexpr const wchar_t* kConnectionKey = kConnectionSettingsKey;
+using testing_support::ScopedRegistryKey;
+using Texts = std::vector<std::wstring>;
+constexpr wchar_t kDesktopKey[] = L"SOFTWARE\\KVEL\\Desktop10.5", kEngineKey[] = L"SOFTWARE\\KVEL\\Engine10.5";
+constexpr wchar_t kKueiKey[] = L"SOFTWARE\\KVEL\\Desktop10.5\\Settings";
+constexpr DWORD kNo = ~0u;  // not stored
 
-std::optional<DWORD> Stored(HKEY root, const wchar_t* key, const wchar_t* name) {
+DWORD Stored(HKEY root, const std::wstring& key, const wchar_t* name) {
   DWORD value = 0;
-  if (!ReadDword(root, key, name, value)) return std::nullopt;
-  return value;
+  return testing_support::ReadDword(root, key, name, value) ? value : kNo;
 }
 
-struct StateCase {
-  const char* name;
-  bool writable;
-  bool adminSetPortal;
-  bool desktop;
-  std::optional<DWORD> kuei;
-  std::optional<DWORD> localPortal;
-  bool kueiChecked;
-  bool localPortalChecked;
+struct Workstation {
+  ScopedRegistryKey desktop{HKEY_LOCAL_MACHINE, kDesktopKey}, engine{HKEY_LOCAL_MACHINE, kEngineKey};
+  ScopedRegistryKey user{HKEY_CURRENT_USER, kSuiteUserKey};
+  ScopedRegistryKey connection{HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Mapora Connection"};
+  testing_support::ScopedDirectory folders{testing_support::ModuleFolder() + L"\\settings-products"};
+  CClientAdminDlg mainDlg;
+  void Install(bool isDesktop, const Texts& packs) {  // nothing without packs
+    if (packs.empty()) return;
+    InstalledProducts& products = mainDlg.m_installedProducts;
+    const std::wstring name = isDesktop ? L"desktop" : L"engine";
+    (isDesktop ? desktop : engine).SetString(L"InstallDir", folders.MakeDir(name));
+    (isDesktop ? products.desktopKey : products.engineKey) = isDesktop ? kDesktopKey : kEngineKey;
+    (isDesktop ? products.desktopInstalled : products.engineInstalled) = true;
+    folders.MakeFile(name + L"\\bin\\it");  // a file named like a pack is no pack
+    for (const std::wstring& pack : packs) folders.MakeDir(name + L"\\bin\\" + pack);
+  }
 };
 
-const StateCase kStateCases[] = {
-    {"Defaults", true, false, true, std::nullopt, std::nullopt, false, false},
-    {"AnyNonzeroTakesPart", true, false, true, 2, 1, true, true},
-    {"OnlyOneSupportsLocalPortal", true, false, true, 0, 2, false, false},
-    {"NoMachineWriteRight", false, false, true, 1, 0, true, false},
-    {"PortalServerSetByAdmin", true, true, true, std::nullopt, 1, false, true},
-    {"DesktopNotInstalled", true, false, false, 1, std::nullopt, true, false},
-};
-
-class DialogState : public testing::TestWithParam<StateCase> {};
-
-TEST_P(DialogState, FollowsRightsProductsAndStoredValues) {
-  const StateCase& c = GetParam();
-  Workstation ws;
-  ws.mainDlg.m_machineSettingsWritable = c.writable;
-  if (c.desktop) ws.InstallDesktop({});
-  ws.InstallEngine({});
-  if (c.adminSetPortal) ws.portalMachineKey.SetDword(L"Portal Server Set By Admin", 1);
-  if (c.kuei) ws.desktopSettingsKey.SetDword(L"EnableKUEI", *c.kuei);
-  if (c.localPortal) ws.portalUserKey.SetDword(L"Support Local Portal", *c.localPortal);
-
-  OpenDialog dlg(ws.mainDlg);
-  EXPECT_EQ(dlg.Enabled(IDC_KUEI_CHECK), c.writable);
-  EXPECT_EQ(dlg.Checked(IDC_KUEI_CHECK), c.kueiChecked);
-  for (int id : {IDC_KUEI_CHECK, IDC_KUEI_GROUP, IDC_KUEI_LINK}) EXPECT_EQ(dlg.Shown(id), c.desktop) << id;
-  EXPECT_EQ(dlg.Enabled(IDC_MANAGE_PORTALS), !c.adminSetPortal);
-  EXPECT_EQ(dlg.Enabled(IDC_LOCAL_PORTAL), !c.adminSetPortal);
-  EXPECT_EQ(dlg.Checked(IDC_LOCAL_PORTAL), c.localPortalChecked);
-  // Opening creates the per-user portal settings key.
-  HKEY key = nullptr;
-  ASSERT_EQ(RegOpenKeyW(HKEY_CURRENT_USER, kConnectionKey, &key), ERROR_SUCCESS);
-  RegCloseKey(key);
-}
-
-INSTANTIATE_TEST_SUITE_P(Cases, DialogState, testing::ValuesIn(kStateCases),
-                         [](const testing::TestParamInfo<StateCase>& info) { return info.param.name; });
-
-// One user action inside the running dialog: a click on a control, or a list selection.
-struct Step {
-  int click;
-  int select = -1;
-};
-Step ClickOn(int id) { return {id}; }
-Step SelectEntry(int index) { return {0, index}; }
-
-struct PersistCase {
-  const char* name;
-  std::optional<DWORD> kuei;
-  std::optional<DWORD> localPortal;
-  DWORD language;  // stored UILANGID, 0 = none
-  bool adminSetPortal;
-  std::vector<Step> steps;
-  int button;
-  std::optional<DWORD> kueiAfter;
-  std::optional<DWORD> localPortalAfter;
-  std::optional<DWORD> languageAfter;
-};
-
-const PersistCase kPersistCases[] = {
-    {"UntouchedKeepsRawProgrammeValue", 2, std::nullopt, 9, false, {}, IDOK, 2, 0, 9},
-    {"UncheckedAndRecheckedWritesOne", 2, 1, 9, false, {ClickOn(IDC_KUEI_CHECK), ClickOn(IDC_KUEI_CHECK)}, IDOK,
-     1, 1, 9},
-    {"LocalPortalAlwaysWrittenAsZeroOrOne", 0, 2, 0, false, {}, IDOK, 0, 0, std::nullopt},
-    {"LocalPortalChecked", 1, 0, 0, false, {ClickOn(IDC_LOCAL_PORTAL), ClickOn(IDC_KUEI_CHECK)}, IDOK, 0, 1,
-     std::nullopt},
-    {"AdminSetPortalStillWritesUnchangedState", std::nullopt, 2, 0, true, {}, IDOK, std::nullopt, 0,
-     std::nullopt},
-    {"WindowsEntryRemovesLanguage", std::nullopt, 1, 0x0C07, false, {SelectEntry(0)}, IDOK, std::nullopt, 1,
-     std::nullopt},
-    {"EnglishEntryStoresNine", std::nullopt, 1, 0, false, {SelectEntry(1)}, IDOK, std::nullopt, 1, 9},
-    {"PackEntryStoresItsLanguage", std::nullopt, 1, 9, false, {SelectEntry(2)}, IDOK, std::nullopt, 1, 0x0C07},
-    {"CancelWritesOnlyTheLanguageAgain", 0, 2, 0x0C07, false,
-     {ClickOn(IDC_KUEI_CHECK), ClickOn(IDC_LOCAL_PORTAL), SelectEntry(1)}, IDCANCEL, 0, 2, 0x0C07},
-    {"CancelKeepsRemovalOfLanguageWithoutPack", 1, 1, 0x0410, false, {SelectEntry(1)}, IDCANCEL, 1, 1,
-     std::nullopt},
-};
-
-class SaveAndCancel : public testing::TestWithParam<PersistCase> {};
-
-TEST_P(SaveAndCancel, WriteWhatTheButtonSays) {
-  const PersistCase& c = GetParam();
-  Workstation ws;
-  ws.InstallDesktop({L"de-AT"});
-  if (c.kuei) ws.desktopSettingsKey.SetDword(L"EnableKUEI", *c.kuei);
-  if (c.localPortal) ws.portalUserKey.SetDword(L"Support Local Portal", *c.localPortal);
-  if (c.language != 0) ws.StoreLanguage(c.language);
-  if (c.adminSetPortal) ws.portalMachineKey.SetDword(L"Portal Server Set By Admin", 1);
-
-  bool pressed = false;
-  WhileModal drive([&] {
-    HWND dialog = settings_tests::FindOwnWindow(L"Advanced Configuration");
-    if (dialog == nullptr) return false;
-    for (const Step& step : c.steps) {
-      if (step.select >= 0)
-        settings_tests::SelectLanguage(dialog, step.select);
-      else
-        Click(dialog, step.click);
-    }
-    Click(dialog, c.button);
-    pressed = true;
-    return true;
+void Click(HWND dlg, int id) { SendMessageW(GetDlgItem(dlg, id), BM_CLICK, 0, 0); }
+LRESULT List(HWND d, UINT m, WPARAM w = 0, LPARAM l = 0) { return SendDlgItemMessageW(d, IDC_LANGUAGE_LIST, m, w, l); }
+// Runs the dialog as the workstation page does; from a timer, inside() acts on it and button closes it.
+std::function<void(HWND)> g_inside;
+void RunDialog(Workstation& ws, int button, const std::function<void(HWND)>& inside) {
+  g_inside = [&](HWND dlg) { inside(dlg); Click(dlg, button); };
+  UINT_PTR timer = SetTimer(nullptr, 0, 50, [](HWND, UINT, UINT_PTR, DWORD) {
+    HWND dlg = FindWindowW(nullptr, L"Advanced Configuration");
+    if (dlg != nullptr && g_inside) std::exchange(g_inside, nullptr)(dlg);
   });
   PersistAdvancedSettings(ws.mainDlg);
-  ASSERT_TRUE(pressed);
-
-  EXPECT_EQ(Stored(HKEY_LOCAL_MACHINE, settings_tests::kDesktopSettingsKey, L"EnableKUEI"), c.kueiAfter);
-  EXPECT_EQ(Stored(HKEY_CURRENT_USER, kConnectionKey, L"Support Local Portal"), c.localPortalAfter);
-  EXPECT_EQ(Stored(HKEY_CURRENT_USER, L"SOFTWARE\\KVEL", L"UILANGID"), c.languageAfter);
-  EXPECT_EQ(ws.mainDlg.m_dwUILangID, c.languageAfter.value_or(0));
+  KillTimer(nullptr, timer);
+  EXPECT_FALSE(g_inside) << "the dialog never showed";
+}
+// The style bit, so that it does not matter whether the dialog itself is shown yet.
+bool Shown(HWND dlg, int id) { return (GetWindowLongW(GetDlgItem(dlg, id), GWL_STYLE) & WS_VISIBLE) != 0; }
+bool Enabled(HWND dlg, int id) { return IsWindowEnabled(GetDlgItem(dlg, id)) != FALSE; }
+void Select(HWND dlg, int index) {  // as the user does: the selection, then the notification
+  List(dlg, CB_SETCURSEL, static_cast<WPARAM>(index));
+  SendMessageW(dlg, WM_COMMAND, MAKEWPARAM(IDC_LANGUAGE_LIST, CBN_SELCHANGE), 0);
 }
 
-INSTANTIATE_TEST_SUITE_P(Cases, SaveAndCancel, testing::ValuesIn(kPersistCases),
-                         [](const testing::TestParamInfo<PersistCase>& info) { return info.param.name; });
+constexpr const wchar_t *kDE = L"Deutsch (Deutschland)", *kAT = L"Deutsch (\u00d6sterreich)",
+                       *kUS = L"English (United States)", *kJa = L"\u65e5\u672c\u8a9e";
+const struct PackCase {
+  const char* name;
+  LANGID ui;
+  Texts desktop, engine, listed;  // packs per product (none: not installed); the entries listed, sorted
+  bool warning;                   // with the Windows language entry selected
+} kPackCases[] = {
+    {"EnUSNeedsNoPackAndIsListedPerFolder", 0x0409, {L"en-US"}, {L"de", L"de-AT", L"en", L"en-US", L"ja", L"xx-YY"},
+     {L"Deutsch", kAT, kUS, kUS, kJa}, false},
+    // A language-only folder shortens the name that the next product's scan compares.
+    {"LaterScanComparesShortenedName", 0x0409, {L"ja"}, {L"de-AT"}, {kAT, kJa}, true},
+    {"LanguageOnlyPackServesCountry", 0x0407, {L"de"}, {}, {L"Deutsch"}, false},
+    {"OnlyLastScannedProductCounts", 0x0407, {L"de-DE"}, {L"ja"}, {kDE, kJa}, true},
+    {"SamePackUnderBothListedOnce", 0x0407, {L"de-DE", L"en-US"}, {L"de-DE"}, {kDE, kUS}, false},
+    {"CountryPack", 0x0C0C, {L"fr-FR"}, {L"fr-CA"}, {L"fran\u00e7ais (Canada)", L"fran\u00e7ais (France)"}, false},
+    {"OtherCountryDoesNotServe", 0x0C0C, {}, {L"fr-FR"}, {L"fran\u00e7ais (France)"}, true},
+};
+const struct { LANGID ui; const wchar_t *entry, *warning; } kUiLanguages[] = {
+    {0x0409, L"Display language (English - United States)", L"Warning: Mapora English language pack"},
+    {0x0407, L"Display language (Deutsch - Deutschland)", L"Warning: Mapora Deutsch language pack"},
+    {0x0C0C, L"Display language (fran\u00e7ais - Canada)", L"Warning: Mapora fran\u00e7ais language pack"},
+};
 
-TEST(MachineSettingsProbe, LeavesTheProbeKeyAsFoundAndAllowsWhenNoSuiteAppRuns) {
-  const std::wstring classKey = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
-  const std::wstring probeKey = classKey + L"\\Implemented Categories\\{40FC6ED5-2438-11CF-A3DB-080036F12502}";
-  ScopedRegistryKey cleanup(HKEY_CLASSES_ROOT, classKey);
-  for (bool present : {false, true}) {
-    if (present) {
-      HKEY key = nullptr;
-      ASSERT_EQ(RegCreateKeyW(HKEY_CLASSES_ROOT, probeKey.c_str(), &key), ERROR_SUCCESS);
-      RegCloseKey(key);
-    }
-    EXPECT_TRUE(CanWriteMachineSettings()) << present;
-    HKEY key = nullptr;
-    bool exists = RegOpenKeyW(HKEY_CLASSES_ROOT, probeKey.c_str(), &key) == ERROR_SUCCESS;
-    if (exists) RegCloseKey(key);
-    EXPECT_EQ(exists, present);
+// Each process runs under one Windows UI language (CTest sets LANG) and takes its cases.
+TEST(LanguageList, ListsPacksAndWarnsWhenNoneServesTheWindowsLanguage) {
+  const LANGID ui = GetUserDefaultUILanguage();
+  auto lang = std::find_if(std::begin(kUiLanguages), std::end(kUiLanguages), [&](auto& l) { return l.ui == ui; });
+  ASSERT_NE(lang, std::end(kUiLanguages)) << "unexpected Windows UI language " << ui;
+  for (const PackCase& c : kPackCases) {
+    if (c.ui != ui) continue;
+    SCOPED_TRACE(c.name);
+    Workstation ws;
+    ws.Install(true, c.desktop);
+    ws.Install(false, c.engine);
+    RunDialog(ws, IDCANCEL, [&](HWND dlg) {
+      Texts texts;
+      wchar_t text[256];
+      for (WPARAM i = 0; List(dlg, CB_GETLBTEXT, i, reinterpret_cast<LPARAM>(text)) >= 0; ++i) texts.push_back(text);
+      ASSERT_GE(texts.size(), 2u);
+      EXPECT_EQ(texts.at(0), lang->entry);
+      std::sort(texts.begin() + 2, texts.end());
+      EXPECT_EQ(Texts(texts.begin() + 2, texts.end()), c.listed);
+      EXPECT_EQ(GetWindowTextOf(GetDlgItem(dlg, IDC_LANGUAGE_WARNING)).rfind(lang->warning, 0), 0u);
+      EXPECT_EQ(Shown(dlg, IDC_LANGUAGE_WARNING), c.warning);
+      Select(dlg, 1);
+      EXPECT_FALSE(Shown(dlg, IDC_LANGUAGE_WARNING));
+    });
   }
 }
 
-// The portal connection manager button, against the stand-in server beside the test program.
-class PortalManagerButton : public testing::Test {
- protected:
-  void SetUp() override { ASSERT_TRUE(SUCCEEDED(OleInitialize(nullptr))); }
-  void TearDown() override { OleUninitialize(); }
-
-  Workstation ws;
-  ScopedRegistryKey classKey{HKEY_CLASSES_ROOT, L"CLSID\\{9A1D3B36-B085-4005-9041-9D70EC893EC8}"};
+enum { kReadOnly = 1, kAdminPortal = 2, kNoDesktop = 4 };
+const struct PersistCase {
+  const char* name;
+  int flags, button;
+  DWORD kuei, local, language;  // stored before opening
+  std::vector<int> steps;       // a control to click, or (below 100) a language entry to select
+  DWORD kueiAfter, localAfter, languageAfter;
+} kPersistCases[] = {
+    {"UntouchedKeepsRawValue", 0, IDOK, 2, 1, 9, {}, 2, 1, 9},
+    {"UncheckedAndRecheckedWritesOne", 0, IDOK, 2, kNo, kNo, {IDC_KUEI_CHECK, IDC_KUEI_CHECK, 1}, 1, 0, 9},
+    {"BoxesChanged", 0, IDOK, 1, 0, 9, {IDC_LOCAL_PORTAL, IDC_KUEI_CHECK, 2}, 0, 1, 0x0C07},
+    {"NoMachineWriteRightNorDesktop", kReadOnly | kNoDesktop, IDOK, kNo, 1, kNo, {}, kNo, 1, kNo},
+    {"PortalSetByAdminStillWritesZeroOrOne", kAdminPortal, IDOK, kNo, 2, 0x0C07, {0}, kNo, 0, kNo},
+    {"CancelWritesOnlyTheLanguage", 0, IDCANCEL, 0, 2, 0x0C07, {IDC_KUEI_CHECK, IDC_LOCAL_PORTAL, 1}, 0, 2, 0x0C07},
+    {"CancelKeepsRemovalOfLanguageWithoutPack", 0, IDCANCEL, 1, 1, 0x0409, {1}, 1, 1, kNo},
 };
 
-// Closes the box with the given caption once it shows, keeping the texts it showed.
-std::function<bool()> CloseBox(std::wstring caption, std::wstring& texts) {
-  return [caption, &texts] {
-    HWND box = settings_tests::FindOwnWindow(caption);
-    if (box == nullptr) return false;
-    texts = settings_tests::ChildTexts(box);
-    PostMessageW(box, WM_COMMAND, IDOK, 0);
-    return true;
-  };
+TEST(SaveAndCancel, ShowTheStoredStateAndWriteWhatTheButtonSays) {
+  for (const PersistCase& c : kPersistCases) {
+    SCOPED_TRACE(c.name);
+    Workstation ws;
+    ws.mainDlg.m_machineSettingsWritable = !(c.flags & kReadOnly);
+    ws.Install(!(c.flags & kNoDesktop), {L"de-AT"});
+    if (c.flags & kAdminPortal)
+      WriteRegistryDword(kPortalMachineSettingsKey, kPortalServerSetByAdminValue, 1, HKEY_LOCAL_MACHINE);
+    if (c.kuei != kNo) WriteRegistryDword(kKueiKey, kEnableKueiValue, c.kuei, HKEY_LOCAL_MACHINE);
+    if (c.local != kNo)
+      WriteRegistryDword(kConnectionSettingsKey, kSupportLocalPortalValue, c.local, HKEY_CURRENT_USER);
+    if (c.language != kNo) ws.user.SetDword(kUILangIDValue, ws.mainDlg.m_dwUILangID = c.language);
+    RunDialog(ws, c.button, [&](HWND dlg) {
+      EXPECT_EQ(Enabled(dlg, IDC_KUEI_CHECK), !(c.flags & kReadOnly));
+      EXPECT_EQ(IsDlgButtonChecked(dlg, IDC_KUEI_CHECK), UINT{c.kuei != kNo && c.kuei != 0});
+      for (int id : {IDC_KUEI_CHECK, IDC_KUEI_GROUP, IDC_KUEI_LINK}) EXPECT_EQ(Shown(dlg, id), !(c.flags & kNoDesktop));
+      for (int id : {IDC_MANAGE_PORTALS, IDC_LOCAL_PORTAL}) EXPECT_EQ(Enabled(dlg, id), !(c.flags & kAdminPortal));
+      EXPECT_EQ(IsDlgButtonChecked(dlg, IDC_LOCAL_PORTAL), UINT{c.local == 1});
+      // A stored language without a pack is gone already; the remaining choice is selected.
+      const DWORD current = ws.mainDlg.m_dwUILangID;
+      EXPECT_EQ(Stored(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue), current == 0 ? kNo : current);
+      EXPECT_EQ(static_cast<DWORD>(List(dlg, CB_GETITEMDATA, static_cast<WPARAM>(List(dlg, CB_GETCURSEL)))), current);
+      for (int step : c.steps) step < 100 ? Select(dlg, step) : Click(dlg, step);
+    });
+    EXPECT_EQ(Stored(HKEY_LOCAL_MACHINE, kKueiKey, kEnableKueiValue), c.kueiAfter);
+    EXPECT_EQ(Stored(HKEY_CURRENT_USER, kConnectionSettingsKey, kSupportLocalPortalValue), c.localAfter);
+    EXPECT_EQ(Stored(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue), c.languageAfter);
+  }
 }
 
-TEST_F(PortalManagerButton, ShowsTheManagersWindow) {
-  HMODULE server = LoadLibraryW((testing_support::ModuleFolder() + L"\\PortalManager.dll").c_str());
-  ASSERT_NE(server, nullptr);
-  auto registerServer = reinterpret_cast<HRESULT(STDAPICALLTYPE*)()>(
-      reinterpret_cast<void*>(GetProcAddress(server, "DllRegisterServer")));
-  ASSERT_NE(registerServer, nullptr);
-  ASSERT_EQ(registerServer(), S_OK);
-
-  OpenDialog dlg(ws.mainDlg);
-  std::wstring shown;
-  WhileModal close(CloseBox(L"Portal Connections", shown));
-  Click(dlg.m_hWnd, IDC_MANAGE_PORTALS);
-  EXPECT_NE(shown.find(L"No portal connections"), std::wstring::npos) << shown;
-}
-
-TEST_F(PortalManagerButton, ClassThatCannotBeCreatedReachesTheApplicationsReport) {
-  ws.portalMachineKey.SetString(L"Portal Manager Class", L"{506C93CE-B221-467F-BB6F-7BDC460CDB23}");
-  CWinApp app;
-  OpenDialog dlg(ws.mainDlg);
-  std::wstring report;
-  WhileModal close(CloseBox(app.GetAppName(), report));
-  Click(dlg.m_hWnd, IDC_MANAGE_PORTALS);
-  EXPECT_NE(report.find(L"The operation could not be completed."), std::wstring::npos) << report;
-  EXPECT_NE(report.find(L"0x80040154"), std::wstring::npos) << report;  // class not registered
+TEST(MachineSettingsProbe, LeavesTheProbeKeyAsFound) {
+  const std::wstring clsid = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
+  const std::wstring probe = clsid + L"\\Implemented Categories\\{40FC6ED5-2438-11CF-A3DB-080036F12502}";
+  ScopedRegistryKey cleanup(HKEY_CLASSES_ROOT, clsid);
+  for (bool present : {false, true}) {
+    if (present) WriteRegistryDword(probe, L"test", 1, HKEY_CLASSES_ROOT);
+    EXPECT_TRUE(CanWriteMachineSettings()) << present;  // no suite application runs
+    EXPECT_EQ(RegDeleteKeyW(HKEY_CLASSES_ROOT, probe.c_str()) == ERROR_SUCCESS, present);
+  }
 }
 
 }  // namespace
