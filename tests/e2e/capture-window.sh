@@ -1,19 +1,13 @@
 #!/bin/sh
-# capture-window.sh SOURCE GEOMETRY OUTPUT.png
-# Photographs GEOMETRY (WxH+X+Y) of the X window SOURCE ("root" or an id) once the picture has
-# stopped changing, so that a window that is still painting is not caught half drawn. OUTPUT
-# appears only when complete. Started by the end-to-end test driver from inside Wine.
-source=$1 geometry=$2 output=$3
+# capture-window.sh SOURCE WxH+X+Y OUTPUT.png: photographs that part of X window SOURCE once two shots
+# agree (not half painted). OUTPUT appears only when complete: the driver cannot wait for this script.
 previous=
 for attempt in $(seq 1 50); do
-  current="$output.$attempt.ppm"
-  import -window "$source" -crop "$geometry" +repage "ppm:$current" || break
+  current="$3.$attempt.ppm"
+  import -window "$1" -crop "$2" +repage "ppm:$current" || break
   if [ -n "$previous" ] && cmp -s "$previous" "$current"; then
-    convert "$current" "$output.partial.png" && mv "$output.partial.png" "$output"
-    break
+    convert "$current" "$3.partial.png" && mv "$3.partial.png" "$3"; break
   fi
-  rm -f "$previous"
-  previous=$current
-  sleep 0.1
+  rm -f "$previous"; previous=$current; sleep 0.1
 done
-rm -f "$output".*.ppm
+rm -f "$3".*.ppm
