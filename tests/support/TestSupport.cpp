@@ -1,42 +1,53 @@
 #include "tests/support/TestSupport.h"
 
+#include <shellapi.h>
 #include <shlobj.h>
 #include <shlwapi.h>
 
 namespace testing_support {
 
-ScopedRegistryKey::ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view)
-    : root_(root), path_(std::move(path)), view_(view) {
-  RegDeleteTreeW(root_, path_.c_str());
-  if (view_ != 0) {
-    HKEY parent = nullptr;
-    // RegDeleteTree has no view flag; open the key's own view and clear it from there.
-    if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_ALL_ACCESS | view_, &parent) == ERROR_SUCCESS) {
-      RegDeleteTreeW(parent, nullptr);
-      RegCloseKey(parent);
-    }
-    RegDeleteKeyExW(root_, path_.c_str(), view_, 0);
-  }
-}
+namespace {
 
-ScopedRegistryKey::~ScopedRegistryKey() {
+// RegDeleteTree has no view flag: the key is opened in its view and cleared from there.
+void DeleteKeyTree(HKEY root, const std::wstring& path, REGSAM view) {
   HKEY key = nullptr;
-  if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_ALL_ACCESS | view_, &key) == ERROR_SUCCESS) {
+  if (RegOpenKeyExW(root, path.c_str(), 0, KEY_ALL_ACCESS | view, &key) == ERROR_SUCCESS) {
     RegDeleteTreeW(key, nullptr);
     RegCloseKey(key);
   }
-  RegDeleteKeyExW(root_, path_.c_str(), view_, 0);
+  RegDeleteKeyExW(root, path.c_str(), view, 0);
 }
 
-static void SetValue(HKEY root, const std::wstring& path, REGSAM view, const wchar_t* name, DWORD type,
-                     const void* data, DWORD size) {
+void SetValue(HKEY root, const std::wstring& path, REGSAM view, const wchar_t* name, DWORD type, const void* data,
+              DWORD size) {
   HKEY key = nullptr;
-  if (RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key,
-                      nullptr) != ERROR_SUCCESS)
+  if (RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr) !=
+      ERROR_SUCCESS)
     return;
   RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size);
   RegCloseKey(key);
 }
+
+void RemoveTree(const std::wstring& path) {
+  // The shell's delete takes a list ended by an empty entry.
+  std::wstring from = path + L'\0';
+  SHFILEOPSTRUCTW operation = {};
+  operation.wFunc = FO_DELETE;
+  operation.pFrom = from.c_str();
+  operation.fFlags = FOF_NO_UI;
+  SHFileOperationW(&operation);
+}
+
+void CreateDirectories(const std::wstring& path) { SHCreateDirectoryExW(nullptr, path.c_str(), nullptr); }
+
+}  // namespace
+
+ScopedRegistryKey::ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view)
+    : root_(root), path_(std::move(path)), view_(view) {
+  DeleteKeyTree(root_, path_, view_);
+}
+
+ScopedRegistryKey::~ScopedRegistryKey() { DeleteKeyTree(root_, path_, view_); }
 
 void ScopedRegistryKey::SetString(const wchar_t* name, const std::wstring& value, DWORD type) {
   SetValue(root_, path_, view_, name, type, value.c_str(),
@@ -62,35 +73,6 @@ bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& 
   DWORD type = 0, size = sizeof value;
   return RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, &type, &value, &size) == ERROR_SUCCESS &&
          type == REG_DWORD && size == sizeof value;
-}
-
-bool ValueExists(HKEY root, const std::wstring& path, const wchar_t* name) {
-  return RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, nullptr, nullptr, nullptr) == ERROR_SUCCESS;
-}
-
-void RemoveTree(const std::wstring& path) {
-  WIN32_FIND_DATAW data;
-  HANDLE find = FindFirstFileW((path + L"\\*").c_str(), &data);
-  if (find != INVALID_HANDLE_VALUE) {
-    do {
-      std::wstring name = data.cFileName;
-      if (name == L"." || name == L"..") continue;
-      std::wstring child = path + L"\\" + name;
-      if (data.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY) {
-        RemoveTree(child);
-      } else {
-        SetFileAttributesW(child.c_str(), FILE_ATTRIBUTE_NORMAL);
-        DeleteFileW(child.c_str());
-      }
-    } while (FindNextFileW(find, &data));
-    FindClose(find);
-  }
-  if (!RemoveDirectoryW(path.c_str())) DeleteFileW(path.c_str());
-}
-
-bool CreateDirectories(const std::wstring& path) {
-  int rc = SHCreateDirectoryExW(nullptr, path.c_str(), nullptr);
-  return rc == ERROR_SUCCESS || rc == ERROR_ALREADY_EXISTS || rc == ERROR_FILE_EXISTS;
 }
 
 bool CopyFileTo(const std::wstring& from, const std::wstring& to) {
@@ -124,13 +106,11 @@ std::wstring ScopedDirectory::MakeFile(const std::wstring& relative, const std::
   return full;
 }
 
-std::wstring CommonFilesFolder() {
+std::wstring MaporaCommonFolder() {
   wchar_t path[MAX_PATH] = L"";
   SHGetSpecialFolderPathW(nullptr, path, CSIDL_PROGRAM_FILES_COMMON, FALSE);
-  return path;
+  return std::wstring(path) + L"\\Mapora";
 }
-
-std::wstring MaporaCommonFolder() { return CommonFilesFolder() + L"\\Mapora"; }
 
 std::wstring ModuleFolder() {
   wchar_t path[MAX_PATH] = L"";

@@ -30,7 +30,6 @@ class ScopedRegistryKey {
 
 // Reads a DWORD value; false when the key or value is missing or not a DWORD.
 bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
-bool ValueExists(HKEY root, const std::wstring& path, const wchar_t* name);
 
 // A folder tree removed (recursively) when created and again when destroyed.
 class ScopedDirectory {
@@ -50,12 +49,9 @@ class ScopedDirectory {
   std::wstring path_;
 };
 
-void RemoveTree(const std::wstring& path);
-bool CreateDirectories(const std::wstring& path);
 bool CopyFileTo(const std::wstring& from, const std::wstring& to);
 
-// <Common Files> as the program sees it, and <Common Files>\Mapora.
-std::wstring CommonFilesFolder();
+// <Common Files>\Mapora as the program sees it.
 std::wstring MaporaCommonFolder();
 // Folder of the running test program.
 std::wstring ModuleFolder();
