@@ -11,9 +11,31 @@ namespace {
 
 // Only an administrator may create keys here. The class is one of the suite's own, registered
 // under the standard "controls" category.
+constexpr wchar_t kMachineWriteProbeClassKey[] = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
 constexpr wchar_t kMachineWriteProbeKey[] =
     L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}\\Implemented Categories\\"
     L"{40FC6ED5-2438-11CF-A3DB-080036F12502}";
+
+bool ClassesKeyExists(const wchar_t* path) {
+  HKEY key = nullptr;
+  if (RegOpenKeyW(HKEY_CLASSES_ROOT, path, &key) != ERROR_SUCCESS) return false;
+  RegCloseKey(key);
+  return true;
+}
+
+// Two rounds of create-or-delete leave the probe key as they found it.
+bool ProbeMachineWrite() {
+  for (int round = 0; round < 2; ++round) {
+    HKEY key = nullptr;
+    if (ClassesKeyExists(kMachineWriteProbeKey)) {
+      if (RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey) != ERROR_SUCCESS) return false;
+    } else {
+      if (RegCreateKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey, &key) != ERROR_SUCCESS) return false;
+      RegCloseKey(key);
+    }
+  }
+  return true;
+}
 
 std::wstring EnableKueiKey(const InstalledProducts& products) { return products.desktopKey + L"\\Settings"; }
 
@@ -108,17 +130,12 @@ void PersistAdvancedSettings(CClientAdminDlg& mainDlg) {
 }
 
 bool CanWriteMachineSettings() {
-  // Two rounds of create-or-delete leave the probe key as they found it.
-  for (int round = 0; round < 2; ++round) {
-    HKEY key = nullptr;
-    if (RegOpenKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey, &key) == ERROR_SUCCESS) {
-      RegCloseKey(key);
-      if (RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey) != ERROR_SUCCESS) return false;
-    } else {
-      if (RegCreateKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey, &key) != ERROR_SUCCESS) return false;
-      RegCloseKey(key);
-    }
-  }
+  // Where the suite has not registered its class, the probe's create makes the class key too;
+  // it goes again, so that looking leaves the workstation as it was.
+  const bool classRegistered = ClassesKeyExists(kMachineWriteProbeClassKey);
+  const bool writable = ProbeMachineWrite();
+  if (!classRegistered) RegDeleteTreeW(HKEY_CLASSES_ROOT, kMachineWriteProbeClassKey);
+  if (!writable) return false;
   CStringArray running;
   GetRunningSuiteApps(running);
   return running.empty();

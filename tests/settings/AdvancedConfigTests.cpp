@@ -162,13 +162,16 @@ TEST(SaveAndCancel, ShowTheStoredStateAndWriteWhatTheButtonSays) {
   }
 }
 
-TEST(MachineSettingsProbe, LeavesTheProbeKeyAsFound) {
+TEST(MachineSettingsProbe, LeavesTheRegistryAsFound) {
   const std::wstring clsid = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
   const std::wstring probe = clsid + L"\\Implemented Categories\\{40FC6ED5-2438-11CF-A3DB-080036F12502}";
   ScopedRegistryKey cleanup(HKEY_CLASSES_ROOT, clsid);
   for (bool present : {false, true}) {
     if (present) WriteRegistryDword(probe, L"test", 1, HKEY_CLASSES_ROOT);
     EXPECT_TRUE(CanWriteMachineSettings()) << present;  // no suite application runs
+    HKEY key = nullptr;
+    EXPECT_EQ(RegOpenKeyW(HKEY_CLASSES_ROOT, clsid.c_str(), &key) == ERROR_SUCCESS, present);
+    if (key != nullptr) RegCloseKey(key);
     EXPECT_EQ(RegDeleteKeyW(HKEY_CLASSES_ROOT, probe.c_str()) == ERROR_SUCCESS, present);
   }
 }
