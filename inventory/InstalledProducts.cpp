@@ -74,7 +74,8 @@ std::wstring ReadRegistryString(HKEY hive, const std::wstring& subkey, const std
   DWORD size = 0;
   LONG status = RegQueryValueExW(key, valueName.c_str(), nullptr, nullptr, nullptr, &size);
   std::vector<wchar_t> buffer;
-  while (status == ERROR_SUCCESS || status == ERROR_MORE_DATA) {
+  // A value that keeps growing under the reader is given up on after a few tries.
+  for (int attempt = 0; attempt < 4 && (status == ERROR_SUCCESS || status == ERROR_MORE_DATA); ++attempt) {
     // Whatever the type, the data is read as UTF-16. Whole zero characters after the data
     // (also after an odd last byte) end the text even when the value carries no terminator.
     buffer.assign(size / sizeof(wchar_t) + 2, L'\0');

@@ -16,11 +16,22 @@ constexpr wchar_t kMachineWriteProbeKey[] =
     L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}\\Implemented Categories\\"
     L"{40FC6ED5-2438-11CF-A3DB-080036F12502}";
 
+constexpr wchar_t kMachineWriteProbeCategoriesKey[] =
+    L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}\\Implemented Categories";
+
 bool ClassesKeyExists(const wchar_t* path) {
   HKEY key = nullptr;
   if (RegOpenKeyW(HKEY_CLASSES_ROOT, path, &key) != ERROR_SUCCESS) return false;
   RegCloseKey(key);
   return true;
+}
+
+// Only a key that is really missing (not merely unreadable) counts as not registered.
+bool ClassesKeyMissing(const wchar_t* path) {
+  HKEY key = nullptr;
+  LONG status = RegOpenKeyW(HKEY_CLASSES_ROOT, path, &key);
+  if (status == ERROR_SUCCESS) RegCloseKey(key);
+  return status == ERROR_FILE_NOT_FOUND;
 }
 
 // Two rounds of create-or-delete leave the probe key as they found it.
@@ -132,9 +143,13 @@ void PersistAdvancedSettings(CClientAdminDlg& mainDlg) {
 bool CanWriteMachineSettings() {
   // Where the suite has not registered its class, the probe's create makes the class key too;
   // it goes again, so that looking leaves the workstation as it was.
-  const bool classRegistered = ClassesKeyExists(kMachineWriteProbeClassKey);
+  const bool classMissing = ClassesKeyMissing(kMachineWriteProbeClassKey);
   const bool writable = ProbeMachineWrite();
-  if (!classRegistered) RegDeleteTreeW(HKEY_CLASSES_ROOT, kMachineWriteProbeClassKey);
+  if (classMissing) {
+    // Only empty keys go: anything registered there meanwhile stays.
+    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeCategoriesKey);
+    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeClassKey);
+  }
   if (!writable) return false;
   CStringArray running;
   GetRunningSuiteApps(running);

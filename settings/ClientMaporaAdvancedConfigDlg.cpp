@@ -74,13 +74,17 @@ const MessageMap* CClientMaporaAdvancedConfigDlg::GetMessageMap() const {
 
 BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
   CDialog::OnInitDialog();
+  // Everything here reads the main window's state; without it there is nothing to show.
+  if (m_pMainDlg == nullptr) {
+    EndDialog(IDCANCEL);
+    return TRUE;
+  }
   BuildLanguageList();
 
-  {
-    CURLTokenManager tokens;
-    ::EnableWindow(GetDlgItem(IDC_MANAGE_PORTALS), tokens.PortalServerSetByAdmin() ? FALSE : TRUE);
-    ::EnableWindow(GetDlgItem(IDC_LOCAL_PORTAL), tokens.PortalServerSetByAdmin() ? FALSE : TRUE);
-  }
+  // The suite's token manager lives until initialisation is over, as the suite expects.
+  CURLTokenManager tokens;
+  ::EnableWindow(GetDlgItem(IDC_MANAGE_PORTALS), tokens.PortalServerSetByAdmin() ? FALSE : TRUE);
+  ::EnableWindow(GetDlgItem(IDC_LOCAL_PORTAL), tokens.PortalServerSetByAdmin() ? FALSE : TRUE);
 
   const InstalledProducts& products = m_pMainDlg->m_installedProducts;
   ::EnableWindow(GetDlgItem(IDC_KUEI_CHECK), m_pMainDlg->m_machineSettingsWritable ? TRUE : FALSE);
@@ -146,7 +150,7 @@ void CClientMaporaAdvancedConfigDlg::CollectLanguagePacks() {
     if (key == nullptr) continue;
     // Plain concatenation: an InstallDir ending in a backslash gives a doubled one, which the
     // file system accepts.
-    ScanLanguagePackFolder(ReadRegistryString(HKEY_LOCAL_MACHINE, *key, L"InstallDir", L"") + L"\\bin\\*");
+    ScanLanguagePackFolder(GetProductBinFolder(*key) + L"*");
   }
 }
 
