@@ -1,7 +1,5 @@
 #include "app/ClientAdminDlg.h"
 
-#include <objidl.h>
-#include <gdiplus.h>
 #include <htmlhelp.h>
 
 #include <iterator>
@@ -9,6 +7,7 @@
 #include "app/AboutDlg.h"
 #include "app/RunningSuiteApps.h"
 #include "framework/App.h"
+#include "framework/GdiPlus.h"
 #include "framework/PngResource.h"
 #include "inventory/ClientMaporaConfigDlg.h"
 #include "locale/KVELLocale.h"

@@ -64,9 +64,10 @@ class CWinApp {
   void ParseCommandLine(CCommandLineInfo& info);
   // Initialises OLE and installs the application's message filter; false on failure.
   bool InitOle();
-  // How long an outgoing call may wait for its answer while messages keep being processed.
-  // Calls that a busy or unresponsive server rejects are retried silently: the framework shows
-  // no "server busy" or "server not responding" dialog.
+  // The delay after which a pending outgoing call would count as unanswered. The framework shows
+  // no "server busy" or "server not responding" dialog, so such a call simply goes on waiting
+  // (messages keep being processed) and a rejected one is retried: the delay is recorded but
+  // changes nothing a user sees.
   void SetMessagePendingDelay(DWORD milliseconds);
   void EnableControlContainer();
   // Loads the rich edit library; false when it cannot be loaded.

@@ -1,12 +1,10 @@
 #include "framework/PngResource.h"
 
-#include <objidl.h>
-#include <gdiplus.h>
-
 #include <cstring>
 #include <memory>
 
 #include "framework/ComRef.h"
+#include "framework/GdiPlus.h"
 #include "framework/Strings.h"
 
 namespace fw {

@@ -59,8 +59,8 @@ CString FormatMessageString(UINT id, const std::vector<CString>& inserts) {
   if (format.empty()) return CString();
   std::vector<DWORD_PTR> args;
   for (const CString& insert : inserts) args.push_back(reinterpret_cast<DWORD_PTR>(insert.c_str()));
-  // Unused insert numbers must still point at something.
-  while (args.size() < 9) args.push_back(reinterpret_cast<DWORD_PTR>(L""));
+  // A (translated) text may name any insert from %1 to %99: every one must point at something.
+  while (args.size() < 99) args.push_back(reinterpret_cast<DWORD_PTR>(L""));
   wchar_t* out = nullptr;
   DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_STRING | FORMAT_MESSAGE_ALLOCATE_BUFFER |
                                     FORMAT_MESSAGE_ARGUMENT_ARRAY,

@@ -33,20 +33,26 @@ HMODULE LoadRegisteredControl() {
   return LoadLibraryW(path);
 }
 
+// The Unicode entry, by name or by its export ordinal.
+HtmlHelpProc FindEntry(HMODULE control) {
+  FARPROC entry = GetProcAddress(control, "HtmlHelpW");
+  if (!entry) entry = GetProcAddress(control, MAKEINTRESOURCEA(15));
+  return reinterpret_cast<HtmlHelpProc>(reinterpret_cast<void*>(entry));
+}
+
 bool BindHtmlHelp() {
   if (g_htmlHelp) return true;
-  HMODULE control = LoadRegisteredControl();
-  if (!control) control = LoadLibraryW(L"hhctrl.ocx");
-  if (!control) return false;
-  auto entry =
-      reinterpret_cast<HtmlHelpProc>(reinterpret_cast<void*>(GetProcAddress(control, "HtmlHelpW")));
-  if (!entry) {
+  // A registered control without the entry is no better than none: the control by name is next.
+  for (HMODULE control : {LoadRegisteredControl(), LoadLibraryW(L"hhctrl.ocx")}) {
+    if (!control) continue;
+    if (HtmlHelpProc entry = FindEntry(control)) {
+      g_helpControl = control;
+      g_htmlHelp = entry;
+      return true;
+    }
     FreeLibrary(control);
-    return false;
   }
-  g_helpControl = control;
-  g_htmlHelp = entry;
-  return true;
+  return false;
 }
 
 }  // namespace
