@@ -11,37 +11,26 @@ namespace {
 
 // Only an administrator may create keys here. The class is one of the suite's own, registered
 // under the standard "controls" category.
-constexpr wchar_t kMachineWriteProbeClassKey[] = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
-constexpr wchar_t kMachineWriteProbeKey[] =
-    L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}\\Implemented Categories\\"
-    L"{40FC6ED5-2438-11CF-A3DB-080036F12502}";
+const std::wstring kMachineWriteProbeClassKey = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
+const std::wstring kMachineWriteProbeCategoriesKey = kMachineWriteProbeClassKey + L"\\Implemented Categories";
+const std::wstring kMachineWriteProbeKey = kMachineWriteProbeCategoriesKey + L"\\{40FC6ED5-2438-11CF-A3DB-080036F12502}";
 
-constexpr wchar_t kMachineWriteProbeCategoriesKey[] =
-    L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}\\Implemented Categories";
-
-bool ClassesKeyExists(const wchar_t* path) {
+// ERROR_SUCCESS when the key opens; ERROR_FILE_NOT_FOUND only when it is really missing.
+LONG ClassesKeyStatus(const std::wstring& path) {
   HKEY key = nullptr;
-  if (RegOpenKeyW(HKEY_CLASSES_ROOT, path, &key) != ERROR_SUCCESS) return false;
-  RegCloseKey(key);
-  return true;
-}
-
-// Only a key that is really missing (not merely unreadable) counts as not registered.
-bool ClassesKeyMissing(const wchar_t* path) {
-  HKEY key = nullptr;
-  LONG status = RegOpenKeyW(HKEY_CLASSES_ROOT, path, &key);
+  LONG status = RegOpenKeyW(HKEY_CLASSES_ROOT, path.c_str(), &key);
   if (status == ERROR_SUCCESS) RegCloseKey(key);
-  return status == ERROR_FILE_NOT_FOUND;
+  return status;
 }
 
 // Two rounds of create-or-delete leave the probe key as they found it.
 bool ProbeMachineWrite() {
   for (int round = 0; round < 2; ++round) {
     HKEY key = nullptr;
-    if (ClassesKeyExists(kMachineWriteProbeKey)) {
-      if (RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey) != ERROR_SUCCESS) return false;
+    if (ClassesKeyStatus(kMachineWriteProbeKey) == ERROR_SUCCESS) {
+      if (RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey.c_str()) != ERROR_SUCCESS) return false;
     } else {
-      if (RegCreateKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey, &key) != ERROR_SUCCESS) return false;
+      if (RegCreateKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey.c_str(), &key) != ERROR_SUCCESS) return false;
       RegCloseKey(key);
     }
   }
@@ -143,12 +132,12 @@ void PersistAdvancedSettings(CClientAdminDlg& mainDlg) {
 bool CanWriteMachineSettings() {
   // Where the suite has not registered its class, the probe's create makes the class key too;
   // it goes again, so that looking leaves the workstation as it was.
-  const bool classMissing = ClassesKeyMissing(kMachineWriteProbeClassKey);
+  const bool classMissing = ClassesKeyStatus(kMachineWriteProbeClassKey) == ERROR_FILE_NOT_FOUND;
   const bool writable = ProbeMachineWrite();
   if (classMissing) {
     // Only empty keys go: anything registered there meanwhile stays.
-    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeCategoriesKey);
-    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeClassKey);
+    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeCategoriesKey.c_str());
+    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeClassKey.c_str());
   }
   if (!writable) return false;
   CStringArray running;
