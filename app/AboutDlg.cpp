@@ -1,6 +1,7 @@
 #include "app/AboutDlg.h"
 
 #include "inventory/InstalledProducts.h"
+#include "inventory/ProductRegistry.h"
 #include "res/resource.h"
 
 CAboutDlg::CAboutDlg() : CDialog(IDD_ABOUTBOX) {}
@@ -33,7 +34,7 @@ CString NormalizeServicePackBuild(const CString& build) {
 }
 
 void LoadInstalledServicePack(CAboutDlg& about) {
-  const std::wstring desktopKey = L"SOFTWARE\\KVEL\\Desktop" + GetProductVersion();
+  const std::wstring desktopKey = ProductKey(kDesktopKeyBase, GetProductVersion());
   CString servicePack = ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPDisplayName", L"");
   CString buildText;
   if (!servicePack.empty()) {

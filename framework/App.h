@@ -7,14 +7,12 @@
 
 #include <exception>
 
+#include "framework/FrameworkIds.h"
 #include "framework/Strings.h"
 #include "framework/Wnd.h"
 
-// Command identifiers and messages the framework routes.
-constexpr UINT ID_HELP = 57670;
-constexpr UINT WM_COMMANDHELP = 0x0365;  // asks a window to show help for its current context
-constexpr UINT IDS_FRAMEWORK_APP_TITLE = 57344;  // string-table entry holding the program name
-constexpr UINT IDS_FRAMEWORK_OPERATION_FAILED = 61700;  // "...%s..." with the failure's description
+// Asks a window to show help for its current context.
+constexpr UINT WM_COMMANDHELP = 0x0365;
 
 // Receives each command-line argument in turn from CWinApp::ParseCommandLine.
 class CCommandLineInfo {

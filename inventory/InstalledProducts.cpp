@@ -5,17 +5,9 @@
 
 #include <cwchar>
 
-namespace {
+#include "inventory/ProductRegistry.h"
 
-const wchar_t kRelease[] = L"10.5";
-// Product keys that carry the release directly after the base (no separator).
-const wchar_t kEngineKeyBase[] = L"SOFTWARE\\KVEL\\Engine";
-const wchar_t kDesktopKeyBase[] = L"SOFTWARE\\KVEL\\Desktop";
-const wchar_t kServerKeyBase[] = L"SOFTWARE\\KVEL\\Server";
-// Skyloft has its own release numbering and installs 64-bit only.
-const wchar_t kSkyloftKey[] = L"SOFTWARE\\Kvel\\Skyloft2016.1";
-const wchar_t kSkyloftRelease[] = L"Skyloft2016.1";
-const wchar_t kSkyloftPathKey[] = L"SOFTWARE\\Skyloft";
+namespace {
 
 // Buffer size for the installation markers; a longer value still counts as set.
 const DWORD kMarkerBufferChars = 256;
@@ -60,7 +52,7 @@ bool ContainsIgnoringCase(const std::vector<std::wstring>& list, const std::wstr
 
 }  // namespace
 
-std::wstring GetProductVersion() { return kRelease; }
+std::wstring GetProductVersion() { return kSuiteRelease; }
 
 std::wstring ReadRegistryString(HKEY hive, const std::wstring& subkey, const std::wstring& valueName,
                                 const std::wstring& defaultText) {
@@ -100,10 +92,10 @@ void DetectInstalledProducts(InstalledProducts& products) {
 
   const std::wstring version = GetProductVersion();
   products.version = version;
-  products.engineKey = kEngineKeyBase + version;
-  products.desktopKey = kDesktopKeyBase + version;
+  products.engineKey = ProductKey(kEngineKeyBase, version);
+  products.desktopKey = ProductKey(kDesktopKeyBase, version);
   products.skyloftKey = kSkyloftKey;
-  products.serverKey = kServerKeyBase + version;
+  products.serverKey = ProductKey(kServerKeyBase, version);
 
   // The installers set one marker per machine; when both exist Desktop wins.
   if (IsMarkerSet(L"KVEL_DESKTOP" + version + L"_INSTALLED"))
@@ -114,7 +106,7 @@ void DetectInstalledProducts(InstalledProducts& products) {
   // A runtime of another release is not the one this console administers, whatever the
   // console's own release text says.
   ForEachRuntime(products.runtimeEnumerator.Get(), [&](long code, const std::wstring& runtimeVersion) {
-    if (runtimeVersion != version || runtimeVersion != kRelease) return;
+    if (runtimeVersion != version || runtimeVersion != kSuiteRelease) return;
     if (code == kSuiteRuntimeDesktop) products.desktopInstalled = true;
     if (code == kSuiteRuntimeEngine) products.engineInstalled = true;
   });

@@ -1,5 +1,6 @@
 // The process-wide user locale and UI language, and where their language packs live.
 #include "locale/LocaleInternals.h"
+#include "locale/SuiteUserSettings.h"
 
 #include <shlobj.h>
 #include <shlwapi.h>
@@ -129,7 +130,7 @@ void GetSuiteFolder(wchar_t (&folder)[kLocalePathChars]) {
 
 bool QuerySettingsValue(const wchar_t* valueName, void* buffer, DWORD size) {
   HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_CURRENT_USER, L"Software\\KVEL", 0, KEY_READ, &key) != ERROR_SUCCESS)
+  if (RegOpenKeyExW(HKEY_CURRENT_USER, kSuiteUserKey, 0, KEY_READ, &key) != ERROR_SUCCESS)
     return false;
   LONG rc = RegQueryValueExW(key, valueName, nullptr, nullptr, static_cast<BYTE*>(buffer), &size);
   RegCloseKey(key);
@@ -140,7 +141,7 @@ LANGID ReadStoredUILangID() {
   // The type is deliberately not checked: any 4-byte value is taken as a LANGID. A value that
   // does not fit leaves the buffer undefined, so it counts as no choice.
   DWORD value = 0;
-  if (!QuerySettingsValue(IsQ4Executable() ? L"Q4-UILANGID" : L"UILANGID", &value, sizeof value))
+  if (!QuerySettingsValue(IsQ4Executable() ? kQ4UILangIDValue : kUILangIDValue, &value, sizeof value))
     return 0;
   return LOWORD(value);
 }

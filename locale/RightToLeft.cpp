@@ -1,5 +1,6 @@
 // Right-to-left switches: the UI language's script and the user's RTL, RTLUI and TABLERTL values.
 #include "locale/LocaleInternals.h"
+#include "locale/SuiteUserSettings.h"
 
 #include <cstring>
 
@@ -42,17 +43,17 @@ KVEL_LOCALE_API bool IsRightToLeftLanguage() {
 KVEL_LOCALE_API bool IsRightToLeft() {
   InitLocale();
   if (!s.rtlKnown) {
-    s.rtl = ReadRTLSetting(L"RTL", true);
+    s.rtl = ReadRTLSetting(kRtlValue, true);
     s.rtlKnown = true;
   }
   return s.rtl;
 }
 
-KVEL_LOCALE_API bool IsRightToLeftUI() { return IsRightToLeft() && ReadRTLSetting(L"RTLUI", true); }
+KVEL_LOCALE_API bool IsRightToLeftUI() { return IsRightToLeft() && ReadRTLSetting(kRtlUIValue, true); }
 
 // Tables stay left to right unless asked for, unlike the rest of the layout.
 KVEL_LOCALE_API bool IsTableRightToLeft() {
-  return IsRightToLeft() && ReadRTLSetting(L"TABLERTL", false);
+  return IsRightToLeft() && ReadRTLSetting(kTableRtlValue, false);
 }
 
 KVEL_LOCALE_API wchar_t GetLeftToRightMark() { return L'\x200E'; }

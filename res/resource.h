@@ -1,6 +1,8 @@
 // Identifiers of the console's resources. The language packs hold the same identifiers.
 #pragma once
 
+#include "framework/FrameworkIds.h"
+
 // Dialog templates
 #define IDD_ABOUTBOX 3001
 #define IDD_MAPORAADMIN_DIALOG 3003
@@ -41,9 +43,7 @@
 #define IDS_LANGUAGE_PACK_MISSING 3603
 #define IDS_SKYLOFT 3645
 #define IDS_SKYLOFT_REPORT 3654
-// Framework strings (see framework/App.h)
-#define IDS_FRAMEWORK_APP_TITLE_RES 57344
-#define IDS_FRAMEWORK_OPERATION_FAILED_RES 61700
+// Framework strings IDS_FRAMEWORK_* come from framework/FrameworkIds.h.
 
 // Controls
 #define IDC_PAGE_TREE 3501
@@ -60,5 +60,5 @@
 #define IDC_MANAGE_PORTALS 3636
 #define IDC_ONLINE_GROUP 3637
 #define IDC_LOCAL_PORTAL 3661
-#define IDC_APPLY_NOW 57000
-#define IDC_HELP_BUTTON 57670
+#define IDC_APPLY_NOW ID_APPLY_NOW
+#define IDC_HELP_BUTTON ID_HELP

@@ -37,8 +37,6 @@ bool ProbeMachineWrite() {
   return true;
 }
 
-std::wstring EnableKueiKey(const InstalledProducts& products) { return products.desktopKey + L"\\Settings"; }
-
 // The per-user portal settings key, created when missing; null when it cannot be.
 HKEY OpenConnectionSettings() {
   HKEY key = nullptr;
@@ -95,7 +93,7 @@ void StoreUILangID(DWORD langId) {
 }
 
 DWORD ReadEnableKuei(const InstalledProducts& products) {
-  return ReadRegistryDword(HKEY_LOCAL_MACHINE, EnableKueiKey(products), kEnableKueiValue, 0);
+  return ReadRegistryDword(HKEY_LOCAL_MACHINE, EnableKueiKey(products.desktopKey), kEnableKueiValue, 0);
 }
 
 DWORD ReadSupportLocalPortal() {
@@ -122,7 +120,7 @@ void PersistAdvancedSettings(CClientAdminDlg& mainDlg) {
     // An untouched box still holds the raw value, so only a real change is written.
     const InstalledProducts& products = mainDlg.m_installedProducts;
     if (dlg.m_enableKuei != ReadEnableKuei(products))
-      WriteRegistryDword(EnableKueiKey(products), kEnableKueiValue, dlg.m_enableKuei, HKEY_LOCAL_MACHINE);
+      WriteRegistryDword(EnableKueiKey(products.desktopKey), kEnableKueiValue, dlg.m_enableKuei, HKEY_LOCAL_MACHINE);
     WriteSupportLocalPortal(dlg.m_supportLocalPortal);
   }
   // Also after Cancel: this rewrites the stored value, or keeps the removal made on opening.

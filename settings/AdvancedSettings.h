@@ -5,19 +5,12 @@
 
 #include <string>
 
+#include "locale/SuiteUserSettings.h"
+#include "settings/SettingsRegistry.h"
+
 class CClientAdminDlg;
 struct InstalledProducts;
 
-// Per-user suite settings: HKEY_CURRENT_USER\SOFTWARE\KVEL, value UILANGID (REG_DWORD, a LANGID;
-// absent = follow the Windows UI language, 9 = English). It is never stored as 0.
-inline constexpr wchar_t kSuiteUserKey[] = L"SOFTWARE\\KVEL";
-inline constexpr wchar_t kUILangIDValue[] = L"UILANGID";
-// Per-user portal settings: value "Support Local Portal" (REG_DWORD, exactly 1 = supported).
-inline constexpr wchar_t kConnectionSettingsKey[] = L"Software\\KVEL\\Mapora Connection\\Settings";
-inline constexpr wchar_t kSupportLocalPortalValue[] = L"Support Local Portal";
-// Per-machine, under the Desktop product key + "\Settings" in HKEY_LOCAL_MACHINE: nonzero = take
-// part in the user experience improvement programme.
-inline constexpr wchar_t kEnableKueiValue[] = L"EnableKUEI";
 
 // The workstation page's "Advanced..." handler: runs the Advanced Configuration dialog modally
 // and writes what it chose.

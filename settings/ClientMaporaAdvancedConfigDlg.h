@@ -12,13 +12,9 @@
 #include <windows.h>
 
 #include "framework/Dialog.h"
+#include "settings/SettingsRegistry.h"
 
 class CClientAdminDlg;
-
-inline constexpr wchar_t kAdministratorMachineKey[] = L"SOFTWARE\\KVEL\\Mapora Administrator";
-inline constexpr wchar_t kSupportSiteValue[] = L"Support Site";
-inline constexpr wchar_t kDefaultSupportSite[] = L"https://support.kvel.example";
-inline constexpr wchar_t kLearnMorePath[] = L"/en/knowledgebase/techarticles/detail/38987";
 
 class CClientMaporaAdvancedConfigDlg : public CDialog {
  public:

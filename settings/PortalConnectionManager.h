@@ -20,7 +20,7 @@
 #include <windows.h>
 #include <unknwn.h>
 
-inline constexpr wchar_t kPortalManagerClassValue[] = L"Portal Manager Class";
+#include "settings/SettingsRegistry.h"
 
 inline constexpr CLSID CLSID_PortalConnectionManager = {
     0x9a1d3b36, 0xb085, 0x4005, {0x90, 0x41, 0x9d, 0x70, 0xec, 0x89, 0x3e, 0xc8}};

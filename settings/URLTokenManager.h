@@ -10,8 +10,8 @@
 
 #include <windows.h>
 
-inline constexpr wchar_t kPortalMachineSettingsKey[] = L"SOFTWARE\\KVEL\\Mapora Connection\\Settings";
-inline constexpr wchar_t kPortalServerSetByAdminValue[] = L"Portal Server Set By Admin";
+#include "settings/SettingsRegistry.h"
+
 
 class CURLTokenManager {
  public:
