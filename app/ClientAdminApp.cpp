@@ -12,15 +12,6 @@ namespace {
 // A remote server may keep an outgoing call waiting this long before the call gives up.
 constexpr DWORD kMessagePendingDelayMs = 45000;
 
-// The control classes the console's templates use: the page tree, the standard controls and
-// the link in the advanced settings.
-void InitCommonControlClasses() {
-  INITCOMMONCONTROLSEX classes = {};
-  classes.dwSize = sizeof classes;
-  classes.dwICC = ICC_TREEVIEW_CLASSES | ICC_STANDARD_CLASSES | ICC_LINK_CLASS;
-  InitCommonControlsEx(&classes);
-}
-
 }  // namespace
 
 CClientAdminApp::~CClientAdminApp() = default;
@@ -35,14 +26,15 @@ BOOL CClientAdminApp::InitInstance() {
   HINSTANCE localized = KVELLocale::LoadLocalizedRes(m_hInstance);
   if (localized != nullptr) fw::SetResourceHandle(localized);
 
-  EnableControlContainer();
+  // No template hosts an ActiveX control, so dialogs need no control container.
   if (!InitOle()) {
     AfxMessageBox(IDS_OLE_INIT_FAILED, MB_OK);
     return FALSE;
   }
   SetMessagePendingDelay(kMessagePendingDelayMs);
   InitRichEdit();
-  InitCommonControlClasses();
+  // The page tree, the standard controls and the link in the advanced settings.
+  InitCommonControls(ICC_TREEVIEW_CLASSES | ICC_STANDARD_CLASSES | ICC_LINK_CLASS);
 
   {
     CClientAdminDlg mainDlg;

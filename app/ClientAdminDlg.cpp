@@ -5,10 +5,10 @@
 #include <iterator>
 
 #include "app/AboutDlg.h"
-#include "app/RunningSuiteApps.h"
+#include "inventory/RunningSuiteApps.h"
 #include "framework/App.h"
-#include "framework/GdiPlus.h"
 #include "framework/PngResource.h"
+#include "framework/RegistryKey.h"
 #include "inventory/ClientMaporaConfigDlg.h"
 #include "locale/KVELLocale.h"
 #include "res/resource.h"
@@ -38,16 +38,12 @@ CString ComputerName() {
 
 }  // namespace
 
+// GDI+ starts with the window object (m_gdiplus), before the tree images need it.
 CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
-  Gdiplus::GdiplusStartupInput gdiplusInput;
-  if (Gdiplus::GdiplusStartup(&m_gdiplusToken, &gdiplusInput, nullptr) != Gdiplus::Ok) m_gdiplusToken = 0;
 }
 
-CClientAdminDlg::~CClientAdminDlg() {
-  if (m_imgTree != nullptr) ImageList_Destroy(m_imgTree);
-  if (m_gdiplusToken != 0) Gdiplus::GdiplusShutdown(m_gdiplusToken);
-}
+CClientAdminDlg::~CClientAdminDlg() = default;
 
 void CClientAdminDlg::DoDataExchange(CDataExchange* pDX) {
   CDialog::DoDataExchange(pDX);
@@ -90,17 +86,14 @@ BOOL CClientAdminDlg::OnInitDialog() {
 }
 
 void CClientAdminDlg::LoadTreeImages() {
-  if (m_imgTree != nullptr) ImageList_Destroy(m_imgTree);
-  m_imgTree = ImageList_Create(16, 16, ILC_COLOR32 | ILC_MASK, 0, 0);
-  if (m_imgTree == nullptr) return;
+  m_imgTree.Reset(ImageList_Create(16, 16, ILC_COLOR32 | ILC_MASK, 0, 0));
+  if (!m_imgTree) return;
   // A missing image is skipped, so the ones after it move up.
   for (UINT id : {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}) {
-    HBITMAP bitmap = fw::LoadPngBitmap(id, kPngBackground);
-    if (bitmap == nullptr) continue;
-    ImageList_AddMasked(m_imgTree, bitmap, kTreeMaskColor);
-    DeleteObject(bitmap);
+    fw::ScopedBitmap bitmap(fw::LoadPngBitmap(id, kPngBackground));
+    if (bitmap) ImageList_AddMasked(m_imgTree.Get(), bitmap.Get(), kTreeMaskColor);
   }
-  TreeView_SetImageList(m_wndTree.m_hWnd, m_imgTree, TVSIL_NORMAL);
+  m_wndTree.SetImageList(m_imgTree.Get(), TVSIL_NORMAL);
 }
 
 void CClientAdminDlg::LoadSettings() {
@@ -113,31 +106,21 @@ void CClientAdminDlg::LoadSettings() {
 void CClientAdminDlg::BuildPageTree() {
   CClientMaporaConfigDlg& rootPage = GetRootPage();
   if (m_bPagesCreated) rootPage.DestroyWindow();
-  HWND tree = m_wndTree.m_hWnd;
-  TreeView_DeleteAllItems(tree);
-
-  CString rootText = fw::FormatString(IDS_WORKSTATION_NODE, ComputerName().c_str());
-  TVINSERTSTRUCTW insert = {};
-  insert.hParent = TVI_ROOT;
-  insert.hInsertAfter = TVI_LAST;
-  insert.item.mask = TVIF_TEXT | TVIF_IMAGE | TVIF_SELECTEDIMAGE;
-  insert.item.pszText = &rootText[0];
-  insert.item.iImage = 0;
-  insert.item.iSelectedImage = 0;
-  m_hRootItem = TreeView_InsertItem(tree, &insert);
+  m_wndTree.DeleteAllItems();
+  m_hRootItem = m_wndTree.InsertItem(fw::FormatString(IDS_WORKSTATION_NODE, ComputerName().c_str()), 0, 0);
 
   // The page places itself beside the tree: its template carries its position.
   rootPage.m_pAdminDlg = this;
   rootPage.Create(IDD_MAPORA_CONFIG, this);
   m_bPagesCreated = true;
 
-  TreeView_Expand(tree, m_hRootItem, TVE_EXPAND);
-  HTREEITEM selectedBefore = TreeView_GetSelection(tree);
-  TreeView_SelectItem(tree, m_hRootItem);
+  m_wndTree.Expand(m_hRootItem, TVE_EXPAND);
+  HTREEITEM selectedBefore = m_wndTree.GetSelectedItem();
+  m_wndTree.SelectItem(m_hRootItem);
   // A tree that selected its first item on its own sends no change for it.
   if (selectedBefore == m_hRootItem && m_hRootItem != nullptr) ShowSelectedPage();
 
-  ::EnableWindow(GetDlgItem(IDC_APPLY_NOW), FALSE);
+  EnableItem(IDC_APPLY_NOW, false);
   SetHelpFilePath();
 }
 
@@ -154,7 +137,7 @@ void CClientAdminDlg::SetHelpFilePath() {
 }
 
 void CClientAdminDlg::ShowSelectedPage() {
-  HTREEITEM selected = TreeView_GetSelection(m_wndTree.m_hWnd);
+  HTREEITEM selected = m_wndTree.GetSelectedItem();
   const bool rootSelected = selected != nullptr && selected == m_hRootItem;
   CClientMaporaConfigDlg& rootPage = GetRootPage();
   if (rootPage.m_hWnd != nullptr) rootPage.ShowWindow(rootSelected ? SW_SHOW : SW_HIDE);
@@ -169,7 +152,9 @@ LRESULT CClientAdminDlg::OnTreeSelChanged(WPARAM, LPARAM) {
   return 0;
 }
 
-void CClientAdminDlg::EnableApply() { ::EnableWindow(GetDlgItem(IDC_APPLY_NOW), TRUE); }
+void CClientAdminDlg::EnableApply() { EnableItem(IDC_APPLY_NOW, true); }
+
+void CClientAdminDlg::OpenAdvancedSettings() { PersistAdvancedSettings(*this); }
 
 LRESULT CClientAdminDlg::OnCommandHelp(WPARAM, LPARAM) {
   UINT helpId = GetHelpID();
@@ -216,7 +201,7 @@ void CClientAdminDlg::OnOK() {
 }
 
 LRESULT CClientAdminDlg::OnApply(WPARAM, LPARAM) {
-  if (Save()) ::EnableWindow(GetDlgItem(IDC_APPLY_NOW), FALSE);
+  if (Save()) EnableItem(IDC_APPLY_NOW, false);
   return 0;
 }
 

@@ -7,23 +7,23 @@
 
 #include <cstdint>
 
+#include "framework/Controls.h"
 #include "framework/Dialog.h"
-#include "inventory/InstalledProducts.h"
+#include "framework/GdiPlus.h"
+#include "inventory/AdminSession.h"
 
-class CClientAdminDlg : public CDialog {
+// The shared state of the run (installed products, display language, whether machine settings
+// may be written) is the AdminSession part, which the pages reach through their back-pointer.
+class CClientAdminDlg : public CDialog, public AdminSession {
  public:
   explicit CClientAdminDlg(CWnd* parent = nullptr);
   ~CClientAdminDlg() override;
 
   // Enables the Apply button; offered to the pages.
-  void EnableApply();
+  void EnableApply() override;
+  void OpenAdvancedSettings() override;
   // The common save of OK and Apply; true when the settings were written.
   bool Save();
-
-  // Shared state of the run, reached by the pages through their back-pointer.
-  DWORD m_dwUILangID = 0;  // chosen display language; 0 = none chosen
-  InstalledProducts m_installedProducts;
-  bool m_machineSettingsWritable = false;
 
  protected:
   void DoDataExchange(CDataExchange* pDX) override;
@@ -47,10 +47,10 @@ class CClientAdminDlg : public CDialog {
   void SetHelpFilePath();
   void ShowAboutBox();
 
-  CWnd m_wndTree;
-  HIMAGELIST m_imgTree = nullptr;
-  HICON m_hIcon = nullptr;
-  ULONG_PTR m_gdiplusToken = 0;
+  CTreeCtrl m_wndTree;
+  fw::ScopedImageList m_imgTree;
+  HICON m_hIcon = nullptr;  // a shared icon: the system frees it with the module
+  fw::GdiplusSession m_gdiplus;
   HTREEITEM m_hRootItem = nullptr;
   bool m_bPagesCreated = false;
 };

@@ -1,31 +1,33 @@
 #include "framework/App.h"
 
+#include <commctrl.h>
 #include <objbase.h>
 #include <ole2.h>
 #include <shellapi.h>
+
+#include "framework/ScopedHandle.h"
 
 namespace {
 CWinApp* g_app = nullptr;
 
 // The description the system has for an HRESULT, in the user's language.
 CString DescribeError(HRESULT hr) {
-  wchar_t* text = nullptr;
+  fw::ScopedLocalMemory<wchar_t> text;
   DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER |
                                     FORMAT_MESSAGE_IGNORE_INSERTS,
-                                nullptr, static_cast<DWORD>(hr), 0, reinterpret_cast<LPWSTR>(&text), 0, nullptr);
+                                nullptr, static_cast<DWORD>(hr), 0, reinterpret_cast<LPWSTR>(text.Receive()), 0,
+                                nullptr);
   CString description;
-  if (length > 0 && text != nullptr) description.assign(text, length);
-  if (text != nullptr) LocalFree(text);
+  if (length > 0 && text) description.assign(text.Get(), length);
   while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
     description.pop_back();
   CString code = fw::Format(L"0x%08lX", static_cast<unsigned long>(hr));
   return description.empty() ? code : description + L" (" + code + L")";
 }
-}  // namespace
 
 // Keeps outgoing COM calls patient: a rejected call is retried and a slow one waited for,
 // while the user interface goes on painting.
-class CWinApp::MessageFilter final : public IMessageFilter {
+class MessageFilter final : public IMessageFilter {
  public:
   DWORD m_pendingDelay = 8000;
 
@@ -38,7 +40,7 @@ class CWinApp::MessageFilter final : public IMessageFilter {
     *out = nullptr;
     return E_NOINTERFACE;
   }
-  // Owned by the application object, which outlives every registration.
+  // Owned by the OLE session, which revokes the registration before it goes.
   ULONG STDMETHODCALLTYPE AddRef() override { return 1; }
   ULONG STDMETHODCALLTYPE Release() override { return 1; }
 
@@ -52,6 +54,30 @@ class CWinApp::MessageFilter final : public IMessageFilter {
   DWORD STDMETHODCALLTYPE MessagePending(HTASK, DWORD, DWORD) override { return PENDINGMSG_WAITDEFPROCESS; }
 };
 
+}  // namespace
+
+// OLE for the application's thread, with its message filter registered; both undone, in the
+// right order, when the session goes.
+class CWinApp::OleSession {
+ public:
+  bool Start() {
+    if (FAILED(OleInitialize(nullptr))) return false;
+    initialized_ = true;
+    CoRegisterMessageFilter(&filter_, nullptr);
+    return true;
+  }
+  ~OleSession() {
+    if (!initialized_) return;
+    CoRegisterMessageFilter(nullptr, nullptr);
+    OleUninitialize();
+  }
+  MessageFilter& Filter() { return filter_; }
+
+ private:
+  MessageFilter filter_;
+  bool initialized_ = false;
+};
+
 void CCommandLineInfo::ParseParam(const wchar_t*, BOOL, BOOL isLast) { ParseLast(isLast); }
 
 void CCommandLineInfo::ParseLast(BOOL isLast) {
@@ -61,7 +87,6 @@ void CCommandLineInfo::ParseLast(BOOL isLast) {
 CWinApp::CWinApp() { g_app = this; }
 
 CWinApp::~CWinApp() {
-  delete m_messageFilter;
   if (g_app == this) g_app = nullptr;
 }
 
@@ -70,11 +95,7 @@ CWinApp* AfxGetApp() { return g_app; }
 BOOL CWinApp::InitInstance() { return TRUE; }
 
 int CWinApp::ExitInstance() {
-  if (m_oleInitialized) {
-    CoRegisterMessageFilter(nullptr, nullptr);
-    OleUninitialize();
-    m_oleInitialized = false;
-  }
+  m_ole.reset();
   return 0;
 }
 
@@ -105,10 +126,9 @@ void CWinApp::ProcessWndProcException(std::exception_ptr error) {
 
 void CWinApp::ParseCommandLine(CCommandLineInfo& info) {
   int argc = 0;
-  LPWSTR* argv = CommandLineToArgvW(GetCommandLineW(), &argc);
-  if (argv == nullptr) return;
-  WalkCommandLine(info, argc, argv);
-  LocalFree(argv);
+  fw::ScopedLocalMemory<LPWSTR> argv(CommandLineToArgvW(GetCommandLineW(), &argc));
+  if (!argv) return;
+  WalkCommandLine(info, argc, argv.Get());
 }
 
 void WalkCommandLine(CCommandLineInfo& info, int argc, const wchar_t* const* argv) {
@@ -120,21 +140,24 @@ void WalkCommandLine(CCommandLineInfo& info, int argc, const wchar_t* const* arg
 }
 
 bool CWinApp::InitOle() {
-  if (FAILED(OleInitialize(nullptr))) return false;
-  m_oleInitialized = true;
-  if (m_messageFilter == nullptr) m_messageFilter = new MessageFilter;
-  CoRegisterMessageFilter(m_messageFilter, nullptr);
+  auto session = std::make_unique<OleSession>();
+  if (!session->Start()) return false;
+  session->Filter().m_pendingDelay = m_pendingDelay;
+  m_ole = std::move(session);
   return true;
 }
 
 void CWinApp::SetMessagePendingDelay(DWORD milliseconds) {
-  if (m_messageFilter == nullptr) m_messageFilter = new MessageFilter;
-  m_messageFilter->m_pendingDelay = milliseconds;
+  m_pendingDelay = milliseconds;
+  if (m_ole) m_ole->Filter().m_pendingDelay = milliseconds;
 }
 
-void CWinApp::EnableControlContainer() {
-  // The console's dialog templates carry only system controls; hosting them needs nothing more.
-  // Kept so that start-up reads like every other suite program's.
+void CWinApp::InitCommonControls(DWORD classes) {
+  // Registering a class twice costs a round trip through the control library; once is enough.
+  DWORD missing = classes & ~m_commonControls;
+  if (missing == 0) return;
+  INITCOMMONCONTROLSEX init = {sizeof init, missing};
+  if (InitCommonControlsEx(&init)) m_commonControls |= missing;
 }
 
 bool CWinApp::InitRichEdit() {

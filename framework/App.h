@@ -6,6 +6,7 @@
 #include <windows.h>
 
 #include <exception>
+#include <memory>
 
 #include "framework/FrameworkIds.h"
 #include "framework/Strings.h"
@@ -67,7 +68,8 @@ class CWinApp {
   // (messages keep being processed) and a rejected one is retried: the delay is recorded but
   // changes nothing a user sees.
   void SetMessagePendingDelay(DWORD milliseconds);
-  void EnableControlContainer();
+  // Registers the common-control classes (ICC_* flags) that are not registered yet.
+  void InitCommonControls(DWORD classes);
   // Loads the rich edit library; false when it cannot be loaded.
   bool InitRichEdit();
 
@@ -83,9 +85,10 @@ class CWinApp {
 
  private:
   CString m_helpFilePath;
-  bool m_oleInitialized = false;
-  class MessageFilter;
-  MessageFilter* m_messageFilter = nullptr;
+  class OleSession;
+  std::unique_ptr<OleSession> m_ole;
+  DWORD m_pendingDelay = 8000;
+  DWORD m_commonControls = 0;
 };
 
 CWinApp* AfxGetApp();

@@ -46,7 +46,11 @@ void DDX_Text(CDataExchange* pDX, int id, CString& value) {
 CDialog::CDialog(UINT templateId, CWnd* parent)
     : m_nIDTemplate(templateId), m_pParentWnd(parent), m_nIDHelp(templateId) {}
 
-CDialog::~CDialog() { DestroyWindow(); }
+CDialog::~CDialog() {
+  // The derived parts are gone already: the window must not reach them while it is destroyed.
+  if (m_hWnd != nullptr) SetWindowLongPtrW(m_hWnd, DWLP_USER, 0);
+  DestroyWindow();
+}
 
 INT_PTR CDialog::DoModal() {
   m_bModal = true;

@@ -74,6 +74,13 @@ class CDialog : public CWnd {
   UINT GetHelpID() const { return m_nIDHelp; }
   void SetHelpID(UINT id) { m_nIDHelp = id; }
 
+  // The dialog's own controls by identifier; a missing control is ignored.
+  void EnableItem(int id, bool enable) const { ::EnableWindow(GetDlgItem(id), enable ? TRUE : FALSE); }
+  void ShowItem(int id, bool show) const { ::ShowWindow(GetDlgItem(id), show ? SW_SHOW : SW_HIDE); }
+  void CheckItem(int id, bool checked) const { ::CheckDlgButton(m_hWnd, id, checked ? BST_CHECKED : BST_UNCHECKED); }
+  bool IsItemChecked(int id) const { return ::IsDlgButtonChecked(m_hWnd, id) == BST_CHECKED; }
+  void SetItemText(int id, const CString& text) const { ::SetDlgItemTextW(m_hWnd, id, text.c_str()); }
+
  protected:
   virtual BOOL OnInitDialog();
   virtual void OnOK();

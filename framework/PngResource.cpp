@@ -5,6 +5,7 @@
 
 #include "framework/ComRef.h"
 #include "framework/GdiPlus.h"
+#include "framework/ScopedHandle.h"
 #include "framework/Strings.h"
 
 namespace fw {
@@ -19,21 +20,17 @@ HBITMAP LoadPngBitmap(UINT id, COLORREF background) {
   if (data == nullptr || size == 0) return nullptr;
 
   // GDI+ decodes from a stream it may read lazily, so it gets a copy it owns.
-  HGLOBAL copy = GlobalAlloc(GMEM_MOVEABLE, size);
-  if (copy == nullptr) return nullptr;
-  void* target = GlobalLock(copy);
-  if (target == nullptr) {
-    GlobalFree(copy);
-    return nullptr;
-  }
+  fw::ScopedGlobalMemory copy(GlobalAlloc(GMEM_MOVEABLE, size));
+  if (!copy) return nullptr;
+  void* target = GlobalLock(copy.Get());
+  if (target == nullptr) return nullptr;
   std::memcpy(target, data, size);
-  GlobalUnlock(copy);
+  GlobalUnlock(copy.Get());
 
   ComRef<IStream> stream;
-  if (FAILED(CreateStreamOnHGlobal(copy, TRUE, stream.Receive()))) {
-    GlobalFree(copy);
-    return nullptr;
-  }
+  if (FAILED(CreateStreamOnHGlobal(copy.Get(), TRUE, stream.Receive()))) return nullptr;
+  // The stream frees the memory from here on.
+  copy.Release();
   std::unique_ptr<Gdiplus::Bitmap> image(Gdiplus::Bitmap::FromStream(stream.Get()));
   HBITMAP bitmap = nullptr;
   if (image && image->GetLastStatus() == Gdiplus::Ok) {

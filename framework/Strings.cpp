@@ -4,6 +4,8 @@
 
 #include <cstdarg>
 
+#include "framework/ScopedHandle.h"
+
 namespace fw {
 namespace {
 HINSTANCE g_resourceModule = nullptr;
@@ -61,14 +63,13 @@ CString FormatMessageString(UINT id, const std::vector<CString>& inserts) {
   for (const CString& insert : inserts) args.push_back(reinterpret_cast<DWORD_PTR>(insert.c_str()));
   // A (translated) text may name any insert from %1 to %99: every one must point at something.
   while (args.size() < 99) args.push_back(reinterpret_cast<DWORD_PTR>(L""));
-  wchar_t* out = nullptr;
+  ScopedLocalMemory<wchar_t> out;
   DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_STRING | FORMAT_MESSAGE_ALLOCATE_BUFFER |
                                     FORMAT_MESSAGE_ARGUMENT_ARRAY,
-                                format.c_str(), 0, 0, reinterpret_cast<LPWSTR>(&out), 0,
+                                format.c_str(), 0, 0, reinterpret_cast<LPWSTR>(out.Receive()), 0,
                                 reinterpret_cast<va_list*>(args.data()));
   CString text;
-  if (length > 0 && out != nullptr) text.assign(out, length);
-  if (out != nullptr) LocalFree(out);
+  if (length > 0 && out) text.assign(out.Get(), length);
   return text;
 }
 

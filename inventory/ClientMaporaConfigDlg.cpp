@@ -8,10 +8,8 @@
 #include <initializer_list>
 #include <iterator>
 
-#include "app/ClientAdminDlg.h"
 #include "framework/ComRef.h"
 #include "res/resource.h"
-#include "settings/AdvancedSettings.h"
 
 namespace {
 
@@ -189,7 +187,7 @@ const MessageMap* CClientMaporaConfigDlg::GetMessageMap() const {
 }
 
 LRESULT CClientMaporaConfigDlg::OnAdvanced(WPARAM, LPARAM) {
-  if (m_pAdminDlg != nullptr) PersistAdvancedSettings(*m_pAdminDlg);
+  if (m_pAdminDlg != nullptr) m_pAdminDlg->OpenAdvancedSettings();
   return 0;
 }
 

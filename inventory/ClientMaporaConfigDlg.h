@@ -3,8 +3,7 @@
 #pragma once
 
 #include "framework/Dialog.h"
-
-class CClientAdminDlg;
+#include "inventory/AdminSession.h"
 
 class CClientMaporaConfigDlg : public CDialog {
  public:
@@ -13,7 +12,7 @@ class CClientMaporaConfigDlg : public CDialog {
   // Rebuilds the report from the registry and the file system.
   void BuildInstallationReport();
 
-  CClientAdminDlg* m_pAdminDlg = nullptr;  // set by the main window before the page is created
+  AdminSession* m_pAdminDlg = nullptr;  // set by the main window before the page is created
 
  protected:
   void DoDataExchange(CDataExchange* pDX) override;

@@ -2,8 +2,9 @@
 
 #include <commctrl.h>
 
-#include "app/ClientAdminDlg.h"
-#include "app/RunningSuiteApps.h"
+#include "framework/RegistryKey.h"
+#include "inventory/AdminSession.h"
+#include "inventory/RunningSuiteApps.h"
 #include "inventory/InstalledProducts.h"
 #include "settings/ClientMaporaAdvancedConfigDlg.h"
 
@@ -56,28 +57,6 @@ void WriteSupportLocalPortal(DWORD supported) {
 
 }  // namespace
 
-DWORD ReadRegistryDword(HKEY root, const std::wstring& keyPath, const std::wstring& valueName, DWORD defaultValue) {
-  HKEY key = nullptr;
-  if (RegOpenKeyW(root, keyPath.c_str(), &key) != ERROR_SUCCESS) return defaultValue;
-  DWORD value = defaultValue;
-  DWORD size = sizeof value;
-  // A value longer than the buffer fails with nothing usable in it.
-  if (RegQueryValueExW(key, valueName.c_str(), nullptr, nullptr, reinterpret_cast<BYTE*>(&value), &size) !=
-      ERROR_SUCCESS)
-    value = defaultValue;
-  RegCloseKey(key);
-  return value;
-}
-
-bool WriteRegistryDword(const std::wstring& keyPath, const std::wstring& valueName, DWORD value, HKEY root) {
-  HKEY key = nullptr;
-  if (RegCreateKeyW(root, keyPath.c_str(), &key) != ERROR_SUCCESS) return false;
-  bool ok = RegSetValueExW(key, valueName.c_str(), 0, REG_DWORD, reinterpret_cast<const BYTE*>(&value),
-                           sizeof value) == ERROR_SUCCESS;
-  RegCloseKey(key);
-  return ok;
-}
-
 void DeleteStoredUILangID() {
   HKEY key = nullptr;
   if (RegOpenKeyExW(HKEY_CURRENT_USER, kSuiteUserKey, 0, KEY_SET_VALUE, &key) != ERROR_SUCCESS) return;
@@ -108,12 +87,10 @@ DWORD ReadSupportLocalPortal() {
   return value == 1 ? 1 : 0;
 }
 
-void PersistAdvancedSettings(CClientAdminDlg& mainDlg) {
-  // The dialog's "Learn More" is a link control, whose class a program registers on demand.
-  INITCOMMONCONTROLSEX controls = {sizeof controls, ICC_LINK_CLASS | ICC_STANDARD_CLASSES};
-  InitCommonControlsEx(&controls);
-
-  CClientMaporaAdvancedConfigDlg dlg(&mainDlg);
+void PersistAdvancedSettings(AdminSession& mainDlg) {
+  // The link control's class is registered at start-up with the others.
+  // Without a parent the box belongs to the main window, as every box of the program does.
+  CClientMaporaAdvancedConfigDlg dlg;
   dlg.m_pMainDlg = &mainDlg;
   if (dlg.DoModal() == IDOK) {
     mainDlg.m_dwUILangID = dlg.m_selectedLangId;

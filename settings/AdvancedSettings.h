@@ -8,21 +8,17 @@
 #include "locale/SuiteUserSettings.h"
 #include "settings/SettingsRegistry.h"
 
-class CClientAdminDlg;
+class AdminSession;
 struct InstalledProducts;
 
 
 // The workstation page's "Advanced..." handler: runs the Advanced Configuration dialog modally
 // and writes what it chose.
-void PersistAdvancedSettings(CClientAdminDlg& mainDlg);
+void PersistAdvancedSettings(AdminSession& mainDlg);
 
 // Whether this user may change machine-wide suite settings right now: a write probe under
 // HKEY_CLASSES_ROOT (left as it was found) and no suite application running.
 bool CanWriteMachineSettings();
-
-// Registry helpers shared with the main window; each returns its default on any failure.
-DWORD ReadRegistryDword(HKEY root, const std::wstring& keyPath, const std::wstring& valueName, DWORD defaultValue);
-bool WriteRegistryDword(const std::wstring& keyPath, const std::wstring& valueName, DWORD value, HKEY root);
 
 // Writes UILANGID, or deletes it when langId is 0 (a missing key or value is no error).
 void StoreUILangID(DWORD langId);

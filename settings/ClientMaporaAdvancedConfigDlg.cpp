@@ -5,7 +5,7 @@
 
 #include <iterator>
 
-#include "app/ClientAdminDlg.h"
+#include "inventory/AdminSession.h"
 #include "inventory/InstalledProducts.h"
 #include "locale/LocaleInternals.h"
 #include "res/resource.h"

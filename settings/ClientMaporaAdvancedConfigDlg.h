@@ -14,7 +14,7 @@
 #include "framework/Dialog.h"
 #include "settings/SettingsRegistry.h"
 
-class CClientAdminDlg;
+class AdminSession;
 
 class CClientMaporaAdvancedConfigDlg : public CDialog {
  public:
@@ -23,7 +23,7 @@ class CClientMaporaAdvancedConfigDlg : public CDialog {
   // The address behind "Learn More".
   static CString LearnMoreAddress();
 
-  CClientAdminDlg* m_pMainDlg = nullptr;  // set by the creator before the dialog is shown
+  AdminSession* m_pMainDlg = nullptr;  // set by the creator before the dialog is shown
   DWORD m_selectedLangId = 0;             // item data of the selected language entry
   DWORD m_enableKuei = 0;                 // raw EnableKUEI until the box is clicked, then 0 or 1
   DWORD m_supportLocalPortal = 0;         // 0 or 1

@@ -1,6 +1,6 @@
 #include "settings/URLTokenManager.h"
 
-#include "settings/AdvancedSettings.h"
+#include "framework/RegistryKey.h"
 
 CURLTokenManager::CURLTokenManager() = default;
 

@@ -2,7 +2,7 @@
 // watched names, each in a folder of its own so that names may repeat.
 #include <gtest/gtest.h>
 
-#include "app/RunningSuiteApps.h"
+#include "inventory/RunningSuiteApps.h"
 #include "tests/support/TestSupport.h"
 
 using namespace testing_support;

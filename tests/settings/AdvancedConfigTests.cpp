@@ -7,6 +7,7 @@
 
 #include "app/ClientAdminDlg.h"
 #include "res/resource.h"
+#include "framework/RegistryKey.h"
 #include "settings/AdvancedSettings.h"
 #include "settings/URLTokenManager.h"
 #include "tests/support/TestSupport.h"

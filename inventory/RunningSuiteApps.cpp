@@ -1,4 +1,4 @@
-#include "app/RunningSuiteApps.h"
+#include "inventory/RunningSuiteApps.h"
 
 #include <tlhelp32.h>
 
