@@ -119,4 +119,23 @@ std::wstring ModuleFolder() {
   return path;
 }
 
+ScopedHiveOverride::ScopedHiveOverride()
+    : scratch_(L"Software\\MaporaTestHives\\" + std::to_wstring(GetCurrentProcessId())) {
+  SHDeleteKeyW(HKEY_CURRENT_USER, scratch_.c_str());
+  RegCreateKeyExW(HKEY_CURRENT_USER, (scratch_ + L"\\HKCU").c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &user_,
+                  nullptr);
+  RegCreateKeyExW(HKEY_CURRENT_USER, (scratch_ + L"\\HKLM").c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr,
+                  &machine_, nullptr);
+  RegOverridePredefKey(HKEY_LOCAL_MACHINE, machine_);
+  RegOverridePredefKey(HKEY_CURRENT_USER, user_);
+}
+
+ScopedHiveOverride::~ScopedHiveOverride() {
+  RegOverridePredefKey(HKEY_CURRENT_USER, nullptr);
+  RegOverridePredefKey(HKEY_LOCAL_MACHINE, nullptr);
+  RegCloseKey(user_);
+  RegCloseKey(machine_);
+  SHDeleteKeyW(HKEY_CURRENT_USER, scratch_.c_str());
+}
+
 }  // namespace testing_support

@@ -28,6 +28,23 @@ class ScopedRegistryKey {
   REGSAM view_;
 };
 
+// For the life of the object, HKEY_CURRENT_USER and HKEY_LOCAL_MACHINE of this process are fresh
+// empty keys under a scratch key of the real HKEY_CURRENT_USER (removed again at the end), so
+// in-process registry tests neither see nor change the real hives and may run in parallel.
+// COM registration and child processes still see the real hives.
+class ScopedHiveOverride {
+ public:
+  ScopedHiveOverride();
+  ~ScopedHiveOverride();
+  ScopedHiveOverride(const ScopedHiveOverride&) = delete;
+  ScopedHiveOverride& operator=(const ScopedHiveOverride&) = delete;
+
+ private:
+  std::wstring scratch_;
+  HKEY user_ = nullptr;
+  HKEY machine_ = nullptr;
+};
+
 // Reads a DWORD value; false when the key or value is missing or not a DWORD.
 bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
 
