@@ -84,7 +84,7 @@ DWORD ReadSupportLocalPortal() {
       value = 0;
     RegCloseKey(key);
   }
-  return value == 1 ? 1 : 0;
+  return LocalPortalSupportFromValue(value);
 }
 
 void PersistAdvancedSettings(AdminSession& mainDlg) {

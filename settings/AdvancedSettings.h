@@ -27,5 +27,7 @@ void DeleteStoredUILangID();
 
 // The raw EnableKUEI of the Desktop product (0 when absent).
 DWORD ReadEnableKuei(const InstalledProducts& products);
+// "Support Local Portal" counts only when it holds exactly 1: 1 then, else 0.
+inline DWORD LocalPortalSupportFromValue(DWORD stored) { return stored == 1 ? 1 : 0; }
 // 1 when "Support Local Portal" holds exactly 1, else 0. Creates the per-user key when missing.
 DWORD ReadSupportLocalPortal();
