@@ -40,13 +40,12 @@ CString ComputerName() {
 
 CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
-  Gdiplus::GdiplusStartupInput gdiplusInput;
-  if (Gdiplus::GdiplusStartup(&m_gdiplusToken, &gdiplusInput, nullptr) != Gdiplus::Ok) m_gdiplusToken = 0;
+  m_gdiplusToken = fw::StartGdiPlus();
 }
 
 CClientAdminDlg::~CClientAdminDlg() {
   if (m_imgTree != nullptr) ImageList_Destroy(m_imgTree);
-  if (m_gdiplusToken != 0) Gdiplus::GdiplusShutdown(m_gdiplusToken);
+  fw::StopGdiPlus(m_gdiplusToken);
 }
 
 void CClientAdminDlg::DoDataExchange(CDataExchange* pDX) {

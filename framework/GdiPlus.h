@@ -1,14 +1,19 @@
-// GDI+ for code built with NOMINMAX: its headers use min and max unqualified.
+// GDI+, bound at run time from the system folder. It is no known library on Windows 7, so an
+// imported gdiplus.dll would be taken from beside the program; bound here, it never is.
 #pragma once
 
 #include <windows.h>
 #include <objidl.h>
 
-#include <algorithm>
+namespace fw {
 
-namespace Gdiplus {
-using std::max;
-using std::min;
-}  // namespace Gdiplus
+// Starts GDI+ (version 1, no debug callback, its own background thread and the system's codecs);
+// the token for StopGdiPlus, or 0 when GDI+ cannot be started.
+ULONG_PTR StartGdiPlus();
+void StopGdiPlus(ULONG_PTR token);
 
-#include <gdiplus.h>
+// The image in the stream as a bitmap drawn on an opaque background; null when GDI+ cannot read
+// it. GDI+ must have been started.
+HBITMAP DecodeBitmap(IStream* stream, COLORREF background);
+
+}  // namespace fw
