@@ -6,6 +6,7 @@
 #include <shellapi.h>
 
 #include "framework/ScopedHandle.h"
+#include "framework/SystemLibrary.h"
 
 namespace {
 CWinApp* g_app = nullptr;
@@ -162,8 +163,9 @@ void CWinApp::InitCommonControls(DWORD classes) {
 
 bool CWinApp::InitRichEdit() {
   // RICHED32 is the classic entry point; the templates use RichEdit20W, which RICHED20 registers.
-  HMODULE classic = LoadLibraryW(L"RICHED32.DLL");
-  HMODULE current = LoadLibraryW(L"RICHED20.DLL");
+  // Both stay loaded for the run: their window classes live as long as they do.
+  HMODULE classic = fw::LoadSystemLibrary(L"RICHED32.DLL");
+  HMODULE current = fw::LoadSystemLibrary(L"RICHED20.DLL");
   return classic != nullptr || current != nullptr;
 }
 
@@ -197,6 +199,8 @@ int AfxMessageBox(const CString& text, UINT type) {
 int AfxMessageBox(UINT stringId, UINT type) { return AfxMessageBox(fw::LoadString(stringId), type); }
 
 int AfxWinMain(HINSTANCE instance) {
+  // Before anything else is loaded by name, the system's own loads included.
+  fw::RestrictLibrarySearch();
   CWinApp* app = AfxGetApp();
   if (app == nullptr) return 1;
   app->m_hInstance = instance;

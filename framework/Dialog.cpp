@@ -59,8 +59,12 @@ INT_PTR CDialog::DoModal() {
   // so that the main window stays disabled while it is up.
   if (owner == nullptr && AfxGetApp() && AfxGetApp()->m_pMainWnd && AfxGetApp()->m_pMainWnd != this)
     owner = AfxGetApp()->m_pMainWnd->m_hWnd;
-  INT_PTR result = DialogBoxParamW(fw::GetResourceHandle(), MAKEINTRESOURCEW(m_nIDTemplate), owner,
-                                   DialogProc, reinterpret_cast<LPARAM>(this));
+  INT_PTR result = -1;
+  do {
+    m_bWindowCreated = false;
+    result = DialogBoxParamW(fw::GetResourceHandle(), MAKEINTRESOURCEW(m_nIDTemplate), owner, DialogProc,
+                             reinterpret_cast<LPARAM>(this));
+  } while (!m_bWindowCreated && fw::RevertToBuiltInResources());
   m_hWnd = nullptr;
   return result;
 }
@@ -69,8 +73,12 @@ bool CDialog::Create(UINT templateId, CWnd* parent) {
   m_bModal = false;
   m_nIDTemplate = templateId;
   m_pParentWnd = parent;
-  HWND hwnd = CreateDialogParamW(fw::GetResourceHandle(), MAKEINTRESOURCEW(templateId),
-                                 parent ? parent->m_hWnd : nullptr, DialogProc, reinterpret_cast<LPARAM>(this));
+  HWND hwnd = nullptr;
+  do {
+    m_bWindowCreated = false;
+    hwnd = CreateDialogParamW(fw::GetResourceHandle(), MAKEINTRESOURCEW(templateId), parent ? parent->m_hWnd : nullptr,
+                              DialogProc, reinterpret_cast<LPARAM>(this));
+  } while (!m_bWindowCreated && fw::RevertToBuiltInResources());
   return hwnd != nullptr;
 }
 
@@ -177,6 +185,7 @@ INT_PTR CALLBACK CDialog::DialogProc(HWND hwnd, UINT message, WPARAM wParam, LPA
     self = reinterpret_cast<CDialog*>(lParam);
     SetWindowLongPtrW(hwnd, DWLP_USER, reinterpret_cast<LONG_PTR>(self));
     self->m_hWnd = hwnd;
+    self->m_bWindowCreated = true;
   } else {
     self = reinterpret_cast<CDialog*>(GetWindowLongPtrW(hwnd, DWLP_USER));
   }

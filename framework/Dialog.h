@@ -63,6 +63,8 @@ class CDialog : public CWnd {
   CDialog& operator=(const CDialog&) = delete;
 
   // Runs the dialog modally; returns the code given to EndDialog, or -1 when it cannot be shown.
+  // A template the localized library cannot build is built from the program's own resources,
+  // which serve from then on (as do Create's).
   INT_PTR DoModal();
   // Creates the dialog modeless (a page inside another window); false when it cannot be created.
   bool Create(UINT templateId, CWnd* parent);
@@ -99,6 +101,9 @@ class CDialog : public CWnd {
   bool m_bDefaultRequested = false;
 
  private:
+  // Set when the window got as far as WM_INITDIALOG: its template and controls were built.
+  bool m_bWindowCreated = false;
+
   static INT_PTR CALLBACK DialogProc(HWND hwnd, UINT message, WPARAM wParam, LPARAM lParam);
   bool Dispatch(UINT message, WPARAM wParam, LPARAM lParam, LRESULT& result);
   INT_PTR HandleMessage(UINT message, WPARAM wParam, LPARAM lParam);

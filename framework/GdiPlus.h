@@ -1,31 +1,19 @@
-// GDI+ for code built with NOMINMAX: its headers use min and max unqualified.
+// GDI+, bound at run time from the system folder. It is no known library on Windows 7, so an
+// imported gdiplus.dll would be taken from beside the program; bound here, it never is.
 #pragma once
 
 #include <windows.h>
 #include <objidl.h>
 
-#include <algorithm>
-
-namespace Gdiplus {
-using std::max;
-using std::min;
-}  // namespace Gdiplus
-
-#include <gdiplus.h>
-
 namespace fw {
 
-// GDI+ for as long as the object lives. A session that failed to start is simply not started:
-// images that need it are then skipped.
+// GDI+ (version 1, no debug callback, its own background thread and the system's codecs) for as
+// long as the object lives. A session that failed to start is simply not started: images that
+// need it are then skipped.
 class GdiplusSession {
  public:
-  GdiplusSession() {
-    Gdiplus::GdiplusStartupInput input;
-    if (Gdiplus::GdiplusStartup(&token_, &input, nullptr) != Gdiplus::Ok) token_ = 0;
-  }
-  ~GdiplusSession() {
-    if (token_ != 0) Gdiplus::GdiplusShutdown(token_);
-  }
+  GdiplusSession();
+  ~GdiplusSession();
   GdiplusSession(const GdiplusSession&) = delete;
   GdiplusSession& operator=(const GdiplusSession&) = delete;
 
@@ -34,5 +22,9 @@ class GdiplusSession {
  private:
   ULONG_PTR token_ = 0;
 };
+
+// The image in the stream as a bitmap drawn on an opaque background; null when GDI+ cannot read
+// it. A GDI+ session must be running.
+HBITMAP DecodeBitmap(IStream* stream, COLORREF background);
 
 }  // namespace fw

@@ -1,7 +1,6 @@
 #include "framework/PngResource.h"
 
 #include <cstring>
-#include <memory>
 
 #include "framework/ComRef.h"
 #include "framework/GdiPlus.h"
@@ -31,13 +30,7 @@ HBITMAP LoadPngBitmap(UINT id, COLORREF background) {
   if (FAILED(CreateStreamOnHGlobal(copy.Get(), TRUE, stream.Receive()))) return nullptr;
   // The stream frees the memory from here on.
   copy.Release();
-  std::unique_ptr<Gdiplus::Bitmap> image(Gdiplus::Bitmap::FromStream(stream.Get()));
-  HBITMAP bitmap = nullptr;
-  if (image && image->GetLastStatus() == Gdiplus::Ok) {
-    Gdiplus::Color color(255, GetRValue(background), GetGValue(background), GetBValue(background));
-    if (image->GetHBITMAP(color, &bitmap) != Gdiplus::Ok) bitmap = nullptr;
-  }
-  return bitmap;
+  return DecodeBitmap(stream.Get(), background);
 }
 
 }  // namespace fw

@@ -15,6 +15,13 @@ HINSTANCE GetResourceHandle() { return g_resourceModule ? g_resourceModule : Get
 
 void SetResourceHandle(HINSTANCE module) { g_resourceModule = module; }
 
+bool RevertToBuiltInResources() {
+  if (GetResourceHandle() == GetModuleHandleW(nullptr)) return false;
+  // The library stays loaded: what was taken from it already (icons among them) lives on.
+  g_resourceModule = nullptr;
+  return true;
+}
+
 CString LoadString(UINT id) {
   // With a zero length LoadStringW hands out a pointer into the resource itself, which is not
   // zero-terminated; the returned length is what counts.

@@ -16,6 +16,9 @@ namespace fw {
 // own module; start-up switches it to the localized resource library.
 HINSTANCE GetResourceHandle();
 void SetResourceHandle(HINSTANCE module);
+// Returns to the program's own resources for the rest of the run: a window the adopted library
+// cannot build is built from them, as without a library. False when they are in use already.
+bool RevertToBuiltInResources();
 
 // String-table entry id of the current resource module; empty when it has none.
 CString LoadString(UINT id);

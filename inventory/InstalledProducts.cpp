@@ -5,6 +5,7 @@
 
 #include <cwchar>
 
+#include "framework/SystemLibrary.h"
 #include "inventory/ProductRegistry.h"
 
 namespace {
@@ -181,16 +182,23 @@ std::wstring GetProductBinFolder(const std::wstring& productKey) {
 std::wstring GetCoreProductVersion(const std::wstring& installDir) {
   // The separator is always added: Windows takes a doubled one when installDir ends with "\".
   const std::wstring path = installDir + L"\\bin\\pfcore.dll";
+  // Bound here rather than imported: the loader would take an imported version.dll from beside
+  // the program before any of its code runs.
+  const fw::SystemLibrary versionLibrary(L"version.dll");
+  auto getSize = versionLibrary.Find<decltype(&GetFileVersionInfoSizeW)>("GetFileVersionInfoSizeW");
+  auto getInfo = versionLibrary.Find<decltype(&GetFileVersionInfoW)>("GetFileVersionInfoW");
+  auto queryValue = versionLibrary.Find<decltype(&VerQueryValueW)>("VerQueryValueW");
+  if (getSize == nullptr || getInfo == nullptr || queryValue == nullptr) return L"?";
   DWORD handle = 0;
-  DWORD size = GetFileVersionInfoSizeW(path.c_str(), &handle);
+  DWORD size = getSize(path.c_str(), &handle);
   if (size == 0) return L"?";
   std::vector<BYTE> block(size);
-  if (!GetFileVersionInfoW(path.c_str(), 0, size, block.data())) return L"?";
+  if (!getInfo(path.c_str(), 0, size, block.data())) return L"?";
 
   // Only the U.S. English Unicode table counts: that is where the suite's build writes it.
   void* value = nullptr;
   UINT length = 0;
-  if (!VerQueryValueW(block.data(), L"\\StringFileInfo\\040904B0\\ProductVersion", &value, &length))
+  if (!queryValue(block.data(), L"\\StringFileInfo\\040904B0\\ProductVersion", &value, &length))
     return L"?";
   const BYTE* text = static_cast<const BYTE*>(value);
   const BYTE* end = block.data() + block.size();

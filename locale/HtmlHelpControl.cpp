@@ -1,4 +1,5 @@
 // Late binding to the HTML Help control, so that programs start on systems without it.
+#include "framework/SystemLibrary.h"
 #include "locale/LocaleInternals.h"
 
 namespace KVELLocale {
@@ -42,8 +43,9 @@ HtmlHelpProc FindEntry(HMODULE control) {
 
 bool BindHtmlHelp() {
   if (g_htmlHelp) return true;
-  // A registered control without the entry is no better than none: the control by name is next.
-  for (HMODULE control : {LoadRegisteredControl(), LoadLibraryW(L"hhctrl.ocx")}) {
+  // A registered control without the entry is no better than none: the control by name is next,
+  // from the system folder only.
+  for (HMODULE control : {LoadRegisteredControl(), fw::LoadSystemLibrary(L"hhctrl.ocx")}) {
     if (!control) continue;
     if (HtmlHelpProc entry = FindEntry(control)) {
       g_helpControl = control;

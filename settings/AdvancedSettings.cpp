@@ -38,6 +38,26 @@ bool ProbeMachineWrite() {
   return true;
 }
 
+// The probe key and each of its parents below the root, deepest first.
+std::vector<std::wstring> ProbeKeyChain() {
+  std::vector<std::wstring> chain;
+  for (std::wstring path = kMachineWriteProbeKey;; path.erase(path.rfind(L'\\'))) {
+    chain.push_back(path);
+    if (path.find(L'\\') == std::wstring::npos) return chain;
+  }
+}
+
+// Removes the key when it holds neither subkeys nor values: whatever was put there meanwhile stays.
+void DeleteEmptyClassesKey(const std::wstring& path) {
+  HKEY key = nullptr;
+  if (RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS) return;
+  DWORD subkeys = 0, values = 0;
+  LONG status = RegQueryInfoKeyW(key, nullptr, nullptr, nullptr, &subkeys, nullptr, nullptr, &values, nullptr,
+                                 nullptr, nullptr, nullptr);
+  RegCloseKey(key);
+  if (status == ERROR_SUCCESS && subkeys == 0 && values == 0) RegDeleteKeyW(HKEY_CLASSES_ROOT, path.c_str());
+}
+
 // The per-user portal settings key, created when missing; null when it cannot be.
 HKEY OpenConnectionSettings() {
   HKEY key = nullptr;
@@ -105,15 +125,15 @@ void PersistAdvancedSettings(AdminSession& mainDlg) {
 }
 
 bool CanWriteMachineSettings() {
-  // Where the suite has not registered its class, the probe's create makes the class key too;
-  // it goes again, so that looking leaves the workstation as it was.
-  const bool classMissing = ClassesKeyStatus(kMachineWriteProbeClassKey) == ERROR_FILE_NOT_FOUND;
+  // Creating the probe key creates whichever of its parents are missing too (the class key where
+  // the suite has not registered its class, its categories key where it lists none); those go
+  // again, so that looking leaves the workstation as it was.
+  const std::vector<std::wstring> chain = ProbeKeyChain();
+  std::vector<bool> missing;
+  for (const std::wstring& path : chain) missing.push_back(ClassesKeyStatus(path) == ERROR_FILE_NOT_FOUND);
   const bool writable = ProbeMachineWrite();
-  if (classMissing) {
-    // Only empty keys go: anything registered there meanwhile stays.
-    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeCategoriesKey.c_str());
-    RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeClassKey.c_str());
-  }
+  for (size_t i = 0; i < chain.size(); ++i)
+    if (missing[i]) DeleteEmptyClassesKey(chain[i]);
   if (!writable) return false;
   CStringArray running;
   GetRunningSuiteApps(running);

@@ -1,0 +1,28 @@
+# cmake -DEXE=<program> -DOBJDUMP=<objdump> -P CheckImports.cmake
+# Fails when the program imports a library that the loader could take from the program's own
+# folder: only known libraries (mapped from the system folder whatever lies beside the program)
+# and the common controls (redirected by the manifest to the side-by-side store) are allowed.
+cmake_minimum_required(VERSION 3.21)
+set(allowed advapi32.dll comctl32.dll gdi32.dll kernel32.dll msvcrt.dll ole32.dll oleaut32.dll shell32.dll
+            shlwapi.dll user32.dll)
+execute_process(COMMAND ${OBJDUMP} -p ${EXE} OUTPUT_VARIABLE dump RESULT_VARIABLE failed)
+if(failed)
+  message(FATAL_ERROR "cannot read ${EXE} with ${OBJDUMP}")
+endif()
+string(REGEX MATCHALL "DLL Name: [^\n]+" imports "${dump}")
+if(NOT imports)
+  message(FATAL_ERROR "no imports found in ${EXE}")
+endif()
+set(unexpected "")
+foreach(line IN LISTS imports)
+  string(REPLACE "DLL Name: " "" name "${line}")
+  string(STRIP "${name}" name)
+  string(TOLOWER "${name}" lower)
+  if(NOT lower IN_LIST allowed)
+    list(APPEND unexpected ${name})
+  endif()
+endforeach()
+if(unexpected)
+  message(FATAL_ERROR "${EXE} imports libraries the loader may take from beside it: ${unexpected}")
+endif()
+message(STATUS "${EXE} imports only known or side-by-side libraries")
