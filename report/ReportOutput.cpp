@@ -15,27 +15,28 @@ bool IsConsole(HANDLE handle) {
   return GetFileType(handle) == FILE_TYPE_CHAR && GetConsoleMode(handle, &mode);
 }
 
-bool WriteToConsole(HANDLE console, const std::wstring& text) {
+DWORD WriteToConsole(HANDLE console, const std::wstring& text) {
   for (size_t at = 0; at < text.size();) {
     size_t count = std::min(kConsoleChunkChars, text.size() - at);
     // A surrogate pair stays in one piece.
     if (at + count < text.size() && IS_HIGH_SURROGATE(text[at + count - 1]) && count > 1) --count;
     DWORD written = 0;
-    if (!WriteConsoleW(console, text.data() + at, static_cast<DWORD>(count), &written, nullptr) || written == 0)
-      return false;
+    if (!WriteConsoleW(console, text.data() + at, static_cast<DWORD>(count), &written, nullptr)) return GetLastError();
+    if (written == 0) return ERROR_WRITE_FAULT;
     at += written;
   }
-  return true;
+  return ERROR_SUCCESS;
 }
 
-bool WriteBytes(HANDLE handle, const std::string& bytes) {
+DWORD WriteBytes(HANDLE handle, const std::string& bytes) {
   for (size_t at = 0; at < bytes.size();) {
     const DWORD count = static_cast<DWORD>(std::min(kFileChunkBytes, bytes.size() - at));
     DWORD written = 0;
-    if (!WriteFile(handle, bytes.data() + at, count, &written, nullptr) || written == 0) return false;
+    if (!WriteFile(handle, bytes.data() + at, count, &written, nullptr)) return GetLastError();
+    if (written == 0) return ERROR_WRITE_FAULT;
     at += written;
   }
-  return true;
+  return ERROR_SUCCESS;
 }
 
 }  // namespace
@@ -60,22 +61,19 @@ std::wstring FromUtf8(const std::string& text) {
   return wide;
 }
 
-bool WriteStandard(DWORD standardHandle, const std::string& utf8) {
+DWORD WriteStandard(DWORD standardHandle, const std::string& utf8) {
   // Nothing to write is no failure, also where the process has no such handle.
-  if (utf8.empty()) return true;
+  if (utf8.empty()) return ERROR_SUCCESS;
   HANDLE handle = GetStdHandle(standardHandle);
-  if (handle == nullptr || handle == INVALID_HANDLE_VALUE) {
-    SetLastError(ERROR_INVALID_HANDLE);
-    return false;
-  }
+  if (handle == nullptr || handle == INVALID_HANDLE_VALUE) return ERROR_INVALID_HANDLE;
   if (IsConsole(handle)) return WriteToConsole(handle, FromUtf8(utf8));
   return WriteBytes(handle, utf8);
 }
 
-bool WriteFileContent(const std::wstring& path, const std::string& utf8) {
+DWORD WriteFileContent(const std::wstring& path, const std::string& utf8) {
   fw::ScopedHandle file(
       CreateFileW(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS, FILE_ATTRIBUTE_NORMAL, nullptr));
-  if (!file) return false;
+  if (!file) return GetLastError();
   return WriteBytes(file.Get(), utf8);
 }
 

@@ -13,13 +13,12 @@ std::string ToUtf8(const std::wstring& text);
 std::wstring FromUtf8(const std::string& text);
 
 // Writes utf8 to a standard handle (STD_OUTPUT_HANDLE, STD_ERROR_HANDLE): with WriteConsoleW
-// when it is a console window, as the bytes themselves when it is redirected. False when the
-// handle is missing or refuses the output; GetLastError tells why.
-bool WriteStandard(DWORD standardHandle, const std::string& utf8);
+// when it is a console window, as the bytes themselves when it is redirected. ERROR_SUCCESS, or
+// the error that stopped it.
+DWORD WriteStandard(DWORD standardHandle, const std::string& utf8);
 
-// Replaces the file's content with utf8. False when it cannot be created or written; GetLastError
-// tells why.
-bool WriteFileContent(const std::wstring& path, const std::string& utf8);
+// Replaces the file's content with utf8. ERROR_SUCCESS, or the error that stopped it.
+DWORD WriteFileContent(const std::wstring& path, const std::string& utf8);
 
 // The system's description of a Win32 error code, without its line break.
 std::wstring DescribeSystemError(DWORD error);

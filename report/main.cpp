@@ -55,6 +55,18 @@ std::wstring ReportText(const InstalledProducts& products) {
   return ComposeInstallationReport(ReadReportInput(products), LoadReportTexts()).text;
 }
 
+// Writes the output to outFile, or to standard output when it is empty.
+int Emit(const std::wstring& outFile, const std::string& output) {
+  const DWORD error = outFile.empty() ? WriteStandard(STD_OUTPUT_HANDLE, output) : WriteFileContent(outFile, output);
+  if (error == ERROR_SUCCESS) return kExitDone;
+  const std::wstring reason = DescribeSystemError(error);
+  if (outFile.empty())
+    PrintError(fw::Format(ToolString(IDS_REPORT_CANNOT_WRITE_OUTPUT).c_str(), reason.c_str()));
+  else
+    PrintError(fw::Format(ToolString(IDS_REPORT_CANNOT_WRITE_FILE).c_str(), outFile.c_str(), reason.c_str()));
+  return kExitFailed;
+}
+
 std::string MakeOutput(const ReportOptions& options) {
   InstalledProducts products;
   DetectProductsAsTheConsoleDoes(products);
@@ -66,10 +78,7 @@ int Run(int argc, const wchar_t* const* argv) {
   const ParsedCommandLine parsed = ParseReportCommandLine(argc, argv);
   if (parsed.error != CommandLineError::None) return UsageError(parsed);
   const ReportOptions& options = parsed.options;
-  if (options.help) {
-    if (WriteStandard(STD_OUTPUT_HANDLE, ToUtf8(ToolString(IDS_REPORT_USAGE)))) return kExitDone;
-    return kExitFailed;
-  }
+  if (options.help) return Emit(L"", ToUtf8(ToolString(IDS_REPORT_USAGE)));
 
   // COM as the console has it: the runtime-information component answers only there.
   CWinApp app;
@@ -77,18 +86,7 @@ int Run(int argc, const wchar_t* const* argv) {
     PrintError(ToolString(IDS_REPORT_OLE_FAILED));
     return kExitFailed;
   }
-  const std::string output = MakeOutput(options);
-
-  if (!options.outFile.empty()) {
-    if (WriteFileContent(options.outFile, output)) return kExitDone;
-    const std::wstring reason = DescribeSystemError(GetLastError());
-    PrintError(fw::Format(ToolString(IDS_REPORT_CANNOT_WRITE_FILE).c_str(), options.outFile.c_str(), reason.c_str()));
-    return kExitFailed;
-  }
-  if (WriteStandard(STD_OUTPUT_HANDLE, output)) return kExitDone;
-  const std::wstring reason = DescribeSystemError(GetLastError());
-  PrintError(fw::Format(ToolString(IDS_REPORT_CANNOT_WRITE_OUTPUT).c_str(), reason.c_str()));
-  return kExitFailed;
+  return Emit(options.outFile, MakeOutput(options));
 }
 
 }  // namespace

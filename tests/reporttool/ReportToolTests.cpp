@@ -107,6 +107,8 @@ struct TextCase {
   const wchar_t *pack, *sectionHeading;
 };
 
+void PrintTo(const TextCase& c, std::ostream* out) { *out << c.name; }
+
 class ReportText : public Workstation, public testing::WithParamInterface<TextCase> {};
 
 TEST_P(ReportText, IsTheConsolePage) {
@@ -207,6 +209,8 @@ struct SettingsCase {
   const char* expected;
 };
 
+void PrintTo(const SettingsCase& c, std::ostream* out) { *out << c.name; }
+
 class ReportSettings : public Workstation, public testing::WithParamInterface<SettingsCase> {};
 
 TEST_P(ReportSettings, AreAsStored) {
@@ -248,6 +252,8 @@ struct ExitCase {
   const char *outStart, *errStart;
   const wchar_t* writtenFile;
 };
+
+void PrintTo(const ExitCase& c, std::ostream* out) { *out << c.name; }
 
 class ReportExit : public Workstation, public testing::WithParamInterface<ExitCase> {};
 
