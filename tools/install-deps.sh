@@ -8,6 +8,8 @@ packages=(
   g++-mingw-w64-i686-posix g++-mingw-w64-x86-64-posix
   binutils-mingw-w64-i686 binutils-mingw-w64-x86-64
   googletest
+  # JSON of MaporaReport (header-only)
+  nlohmann-json3-dev
   wine wine64 fonts-wine
   xvfb xauth x11-utils imagemagick
   fp-utils

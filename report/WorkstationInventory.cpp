@@ -1,0 +1,127 @@
+#include "report/WorkstationInventory.h"
+
+#include <nlohmann/json.hpp>
+#include <vector>
+
+#include "framework/RegistryKey.h"
+#include "locale/SuiteUserSettings.h"
+#include "report/ReportOutput.h"
+#include "settings/AdvancedSettings.h"
+#include "settings/URLTokenManager.h"
+
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+// What ReadRegistryDword hands back when UILANGID is missing; the console reads it the same way.
+constexpr DWORD kNoStoredLanguage = 0xFFFFFFFF;
+
+struct InstallField {
+  const char* name;
+  std::wstring ProductInstallInfo::*member;
+};
+
+// Every installation value, named as in ProductInstallInfo.
+const InstallField kInstallFields[] = {
+    {"installDir", &ProductInstallInfo::installDir},
+    {"installer", &ProductInstallInfo::installer},
+    {"productName", &ProductInstallInfo::productName},
+    {"imageLocation", &ProductInstallInfo::imageLocation},
+    {"installDate", &ProductInstallInfo::installDate},
+    {"installTime", &ProductInstallInfo::installTime},
+    {"realVersion", &ProductInstallInfo::realVersion},
+    {"spNumber", &ProductInstallInfo::spNumber},
+    {"spBuild", &ProductInstallInfo::spBuild},
+    {"spInstaller", &ProductInstallInfo::spInstaller},
+    {"spInstallDate", &ProductInstallInfo::spInstallDate},
+    {"spInstallTime", &ProductInstallInfo::spInstallTime},
+    {"spStatus", &ProductInstallInfo::spStatus},
+    {"spDisplayName", &ProductInstallInfo::spDisplayName},
+    {"productVersion", &ProductInstallInfo::productVersion},
+};
+
+std::wstring ComputerName() {
+  std::vector<wchar_t> name(MAX_COMPUTERNAME_LENGTH + 1);
+  DWORD size = static_cast<DWORD>(name.size());
+  if (!GetComputerNameW(name.data(), &size)) {
+    // Longer names than NetBIOS allows exist; size now holds what the name needs.
+    if (GetLastError() != ERROR_BUFFER_OVERFLOW) return std::wstring();
+    name.resize(size + 1);
+    size = static_cast<DWORD>(name.size());
+    if (!GetComputerNameW(name.data(), &size)) return std::wstring();
+  }
+  return std::wstring(name.data(), size);
+}
+
+Json Product(bool installed, const std::wstring& key, const ProductInstallInfo& info) {
+  Json product = {{"installed", installed}, {"registryKey", ToUtf8(key)}};
+  for (const InstallField& field : kInstallFields) product[field.name] = ToUtf8(info.*field.member);
+  return product;
+}
+
+}  // namespace
+
+void DetectProductsAsTheConsoleDoes(InstalledProducts& products) {
+  // The enumerator it keeps is what detection asks about the installed runtimes.
+  ListInstalledRuntimeVersions(products);
+  DetectInstalledProducts(products);
+}
+
+StoredSuiteSettings ReadStoredSuiteSettings(const InstalledProducts& products) {
+  StoredSuiteSettings settings;
+  const DWORD uiLangId = ReadRegistryDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue, kNoStoredLanguage);
+  if (uiLangId != kNoStoredLanguage) settings.uiLangId = uiLangId;
+  settings.enableKuei = ReadEnableKuei(products);
+  // The dialog's own reader creates the per-user key; an inventory only opens it.
+  settings.localPortalSupport = LocalPortalSupportFromValue(
+      ReadRegistryDword(HKEY_CURRENT_USER, kConnectionSettingsKey, kSupportLocalPortalValue, 0));
+  CURLTokenManager tokenManager;
+  settings.portalServerSetByAdmin = tokenManager.PortalServerSetByAdmin();
+  return settings;
+}
+
+WorkstationInventory ReadWorkstationInventory(const InstalledProducts& products) {
+  WorkstationInventory inventory;
+  inventory.release = products.version;
+  inventory.computerName = ComputerName();
+  inventory.desktopKey = products.desktopKey;
+  inventory.engineKey = products.engineKey;
+  inventory.skyloftKey = products.skyloftKey;
+  inventory.serverKey = products.serverKey;
+  inventory.values = ReadReportInput(products);
+  inventory.settings = ReadStoredSuiteSettings(products);
+  return inventory;
+}
+
+std::string InventoryJson(const WorkstationInventory& inventory) {
+  const ReportInput& values = inventory.values;
+  const StoredSuiteSettings& settings = inventory.settings;
+  Json skyloft = {{"installed", values.skyloftInstalled},
+                  {"registryKey", ToUtf8(inventory.skyloftKey)},
+                  {"installDir", ToUtf8(values.skyloftInstallDir)}};
+  Json displayLanguage = {{"uiLangId", nullptr}, {"followsWindows", true}};
+  if (settings.uiLangId) {
+    displayLanguage["uiLangId"] = *settings.uiLangId;
+    // 0 is never written by the console, but means the same as no value to every reader.
+    displayLanguage["followsWindows"] = *settings.uiLangId == 0;
+  }
+  Json document = {
+      {"release", ToUtf8(inventory.release)},
+      {"computerName", ToUtf8(inventory.computerName)},
+      {"session",
+       {{"user", ToUtf8(values.session.user)},
+        {"appDataFolder", ToUtf8(values.session.appData)},
+        {"tempFolder", ToUtf8(values.session.temp)}}},
+      {"products",
+       {{"desktop", Product(values.desktopInstalled, inventory.desktopKey, values.desktop)},
+        {"engine", Product(values.engineInstalled, inventory.engineKey, values.engine)},
+        {"skyloft", skyloft},
+        {"server", Product(values.serverInstalled, inventory.serverKey, values.server)}}},
+      {"settings",
+       {{"displayLanguage", displayLanguage},
+        {"improvementProgram", {{"enableKuei", settings.enableKuei}, {"on", settings.enableKuei != 0}}},
+        {"localPortalSupport", settings.localPortalSupport == 1},
+        {"portalServerSetByAdmin", settings.portalServerSetByAdmin}}},
+  };
+  return document.dump(2) + "\n";
+}

@@ -1,0 +1,44 @@
+// What MaporaReport reads of a workstation: the products as the console detects them, every
+// installation value the console's report reads, and the suite settings as they are stored.
+// Reading changes nothing: no key is created and the machine-settings probe does not run.
+#pragma once
+
+#include <windows.h>
+
+#include <optional>
+#include <string>
+
+#include "inventory/InstallationReport.h"
+
+struct StoredSuiteSettings {
+  // UILANGID as the console takes it; none when it is not stored.
+  std::optional<DWORD> uiLangId;
+  // Raw EnableKUEI of the Desktop product; 0 when absent.
+  DWORD enableKuei = 0;
+  // 1 when "Support Local Portal" counts as set, else 0.
+  DWORD localPortalSupport = 0;
+  bool portalServerSetByAdmin = false;
+};
+
+struct WorkstationInventory {
+  std::wstring release;
+  std::wstring computerName;
+  std::wstring desktopKey;
+  std::wstring engineKey;
+  std::wstring skyloftKey;
+  std::wstring serverKey;
+  // The installed flags, the products' values and the session folders, as the report has them.
+  ReportInput values;
+  StoredSuiteSettings settings;
+};
+
+// Lists the runtimes and detects the products exactly as the console's main window does; COM
+// must be initialised on the calling thread.
+void DetectProductsAsTheConsoleDoes(InstalledProducts& products);
+
+StoredSuiteSettings ReadStoredSuiteSettings(const InstalledProducts& products);
+WorkstationInventory ReadWorkstationInventory(const InstalledProducts& products);
+
+// One JSON document (UTF-8, ending with a line break); its schema is in the README, section
+// "Fleet inventory with MaporaReport".
+std::string InventoryJson(const WorkstationInventory& inventory);
