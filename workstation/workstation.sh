@@ -132,8 +132,10 @@ step_portal_manager() {
   wine_quiet regsvr32 /s "$STANDINS_DIR\\PortalManager.dll" || die "regsvr32 PortalManager.dll failed"
 }
 
+# The console, and beside it the headless report that inventory jobs run.
 step_console() {
   install_file "$(built app/MaporaAdmin.exe)" "$CONSOLE_EXE"
+  install_file "$(built report/MaporaReport.exe)" "$CONSOLE_DIR\\MaporaReport.exe"
 }
 
 # The console's language packs where it loads them, <Common Files>\Mapora\bin\<tag> as the 64-bit
