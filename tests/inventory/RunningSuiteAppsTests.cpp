@@ -1,6 +1,7 @@
 // The running-application guard: which watched names a process list shows, the refusal text,
 // and the process snapshot it reads them from.
 #include <gtest/gtest.h>
+#include <process.h>
 
 #include "framework/ScopedHandle.h"
 #include "inventory/RunningSuiteApps.h"
@@ -42,20 +43,14 @@ class RunningCopy {
  public:
   RunningCopy(const std::wstring& folder, const std::wstring& exeName) {
     const std::wstring parent = std::to_wstring(GetCurrentProcessId());
-    const std::wstring semaphoreName = L"MaporaGuardTest-" + parent;
-    fw::ScopedHandle started(CreateSemaphoreW(nullptr, 0, 1, semaphoreName.c_str()));
+    const std::wstring signal = L"MaporaGuardTest-" + parent;
+    fw::ScopedHandle started(CreateSemaphoreW(nullptr, 0, 1, signal.c_str()));
     const std::wstring exe = folder + L"\\" + exeName;
-    std::wstring commandLine = L"\"" + exe + L"\" " + semaphoreName + L" " + parent + L" 120000";
-    STARTUPINFOW startup = {};
-    startup.cb = sizeof startup;
-    PROCESS_INFORMATION info = {};
-    if (!CopyFileTo(ModuleFolder() + L"\\waiting_process.exe", exe) ||
-        !CreateProcessW(exe.c_str(), &commandLine[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup, &info))
-      return;
-    process_.Reset(info.hProcess);
-    fw::ScopedHandle thread(info.hThread);
+    if (!CopyFileTo(ModuleFolder() + L"\\waiting_process.exe", exe)) return;
+    process_.Reset(reinterpret_cast<HANDLE>(
+        _wspawnl(_P_NOWAIT, exe.c_str(), exeName.c_str(), signal.c_str(), parent.c_str(), L"120000", nullptr)));
     // Only a program that has signalled surely shows in a snapshot.
-    running_ = WaitForSingleObject(started.Get(), 30000) == WAIT_OBJECT_0;
+    running_ = process_ && WaitForSingleObject(started.Get(), 30000) == WAIT_OBJECT_0;
   }
   ~RunningCopy() {
     if (!process_) return;

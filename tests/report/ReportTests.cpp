@@ -100,9 +100,6 @@ TEST(ComposeInstallationReport, InstalledProductsInFixedOrderWithTheirHeadingsEm
       {"Skyloft after Desktop, ending in a line break and a blank", Installed(true, false, true, false), kTexts,
        Block(L"DESKTOP", Values(L"desktop")) + kSkyloftBlock,
        {{L"DESKTOP", 0}, {L"SKYLOFT", 0}, {kInstall, 0}, {kInstall, 1}, {kServicePack, 0}}},
-      {"a block after Skyloft starts on its last line", Installed(false, false, true, true), kTexts,
-       kSkyloftBlock + Block(L"SERVER", Values(L"server")),
-       {{L"SKYLOFT", 0}, {L"SERVER", 0}, {kInstall, 0}, {kInstall, 1}, {kServicePack, 0}}},
       {"an upper-case ENGINE in a Desktop value takes the heading's emphasis",
        Installed(true, true, false, false, capitalEngine), kTexts,
        Block(L"DESKTOP", capitalEngine) + Block(L"ENGINE", Values(L"engine")),
@@ -138,7 +135,6 @@ TEST(OffersAdvancedSettings, ForDesktopOrEngineInsideTheSharedProgramFolder) {
       {"neither Desktop nor Engine", false, common, inside, false},
       {"outside the folder", true, common, L"D:\\Tools\\MaporaAdmin.exe", false},
       {"letter case counts", true, common, L"c:\\program files (x86)\\common files\\MaporaAdmin.exe", false},
-      {"a folder beginning with its name counts", true, common, common + L" Extra\\MaporaAdmin.exe", true},
       {"unknown folder", true, L"", L"D:\\Tools\\MaporaAdmin.exe", true},
       {"unknown program path", true, common, L"", true},
   };
