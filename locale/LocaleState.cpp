@@ -47,12 +47,6 @@ void FetchLocaleNames(LANGID id, wchar_t (&langName)[kLocaleNameChars],
   }
 }
 
-// Keeps the packs of the language that count; false when none does.
-bool FindLanguagePacks(const wchar_t* base, const wchar_t* langName, const wchar_t* countryName,
-                       wchar_t (&langDir)[kLocalePathChars], wchar_t (&langCountryDir)[kLocalePathChars]) {
-  return ChooseLanguagePacks(base, langName, countryName, LanguagePackCounts, langDir, langCountryDir);
-}
-
 bool IsEnglish(LANGID id) { return id == kEnglishUS || id == kEnglishNeutral; }
 
 void InitUserLocale() {
@@ -65,10 +59,12 @@ void InitUserLocale() {
   // The user locale's packs always live under the suite folder, q4.exe included.
   wchar_t base[kLocalePathChars];
   GetSuiteFolder(base);
-  FindLanguagePacks(base, s.langName, s.countryName, s.langDir, s.langCountryDir);
+  ChooseLanguagePacks(base, s.langName, s.countryName, LanguagePackCounts, s.langDir, s.langCountryDir);
 }
 
-LANGID ComposeLangID(unsigned short langId, unsigned short countryId) { return MAKELANGID(langId, countryId); }
+LANGID ComposeLangID(unsigned short langId, unsigned short countryId) {
+  return static_cast<LANGID>(MAKELANGID(langId, countryId));
+}
 
 // A field of the state as it stands once the state has been computed.
 template <class Field>
@@ -128,7 +124,8 @@ void InitUILocale() {
   FetchLocaleNames(id, s.uiLangName, s.uiCountryName);
   wchar_t base[kLocalePathChars];
   GetUILanguageBase(base);
-  if (!FindLanguagePacks(base, s.uiLangName, s.uiCountryName, s.uiLangDir, s.uiLangCountryDir)) {
+  if (!ChooseLanguagePacks(base, s.uiLangName, s.uiCountryName, LanguagePackCounts, s.uiLangDir,
+                           s.uiLangCountryDir)) {
     // No pack: show English, but keep the requested names so that translated help is still
     // found for a language whose resources are not installed.
     s.uiLangId = PRIMARYLANGID(kEnglishUS);
