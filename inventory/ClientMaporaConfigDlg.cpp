@@ -3,7 +3,6 @@
 #include <richedit.h>
 #include <shlobj.h>
 
-#include <cwchar>
 #include <iterator>
 
 #include "inventory/InstallationReport.h"
@@ -29,19 +28,31 @@ void EmphasiseRanges(const CWnd& richEdit, const InstallationReport& report) {
   }
 }
 
-// The console only offers the advanced settings to a copy started from the suite's shared
-// 32-bit program folder; when either path cannot be determined it keeps the offer.
-bool StartedFromCommonFilesX86() {
-  wchar_t commonFiles[kPathChars] = L"";
-  if (FAILED(SHGetFolderPathW(nullptr, CSIDL_PROGRAM_FILES_COMMONX86, nullptr, SHGFP_TYPE_CURRENT, commonFiles)))
-    return true;
-  wchar_t modulePath[kPathChars] = L"";
-  if (GetModuleFileNameW(nullptr, modulePath, kPathChars) == 0) return true;
-  modulePath[kPathChars - 1] = L'\0';
-  return std::wcsncmp(modulePath, commonFiles, std::wcslen(commonFiles)) == 0;
+// The program's path and the 32-bit common program files folder; empty where unknown.
+std::wstring ProgramPath() {
+  wchar_t path[kPathChars] = L"";
+  if (GetModuleFileNameW(nullptr, path, kPathChars) == 0) return std::wstring();
+  path[kPathChars - 1] = L'\0';
+  return path;
+}
+
+std::wstring CommonFilesX86() {
+  wchar_t folder[kPathChars] = L"";
+  if (FAILED(SHGetFolderPathW(nullptr, CSIDL_PROGRAM_FILES_COMMONX86, nullptr, SHGFP_TYPE_CURRENT, folder)))
+    return std::wstring();
+  return folder;
 }
 
 }  // namespace
+
+bool OffersAdvancedSettings(bool desktopOrEngineInstalled, const std::wstring& commonFilesX86,
+                            const std::wstring& programPath) {
+  if (!desktopOrEngineInstalled) return false;
+  // The console only offers the advanced settings to a copy started from the suite's shared
+  // 32-bit program folder; when either path cannot be determined it keeps the offer.
+  if (commonFilesX86.empty() || programPath.empty()) return true;
+  return programPath.compare(0, commonFilesX86.size(), commonFilesX86) == 0;
+}
 
 CClientMaporaConfigDlg& GetRootPage() {
   static CClientMaporaConfigDlg page;
@@ -86,6 +97,5 @@ void CClientMaporaConfigDlg::BuildInstallationReport() {
 void CClientMaporaConfigDlg::UpdateAdvancedButton() {
   bool desktopOrEngine = m_pAdminDlg != nullptr && (m_pAdminDlg->m_installedProducts.desktopInstalled ||
                                                     m_pAdminDlg->m_installedProducts.engineInstalled);
-  bool visible = desktopOrEngine && StartedFromCommonFilesX86();
-  ShowItem(IDC_ADVANCED, visible);
+  ShowItem(IDC_ADVANCED, OffersAdvancedSettings(desktopOrEngine, CommonFilesX86(), ProgramPath()));
 }

@@ -2,6 +2,8 @@
 // time the page is selected, and the "Advanced..." button.
 #pragma once
 
+#include <string>
+
 #include "framework/Dialog.h"
 #include "inventory/AdminSession.h"
 
@@ -28,3 +30,9 @@ class CClientMaporaConfigDlg : public CDialog {
 
 // The page object lives as long as the program; its window only while the main window does.
 CClientMaporaConfigDlg& GetRootPage();
+
+// Whether the page offers "Advanced...": for Desktop or Engine, to a program whose path begins
+// with the 32-bit common program files folder (letter case counts). An empty path stands for one
+// that could not be had, and then the offer stands.
+bool OffersAdvancedSettings(bool desktopOrEngineInstalled, const std::wstring& commonFilesX86,
+                            const std::wstring& programPath);

@@ -5,6 +5,7 @@
 
 #include <cwchar>
 
+#include "framework/RegistryKey.h"
 #include "framework/SystemLibrary.h"
 #include "inventory/ProductRegistry.h"
 
@@ -25,11 +26,10 @@ std::wstring TakeBstr(BSTR& text) {
   return result;
 }
 
-// Restarts the walk and hands every item to visit; a failing Next ends the walk like the end
-// of the list does.
-template <class Visit>
-void ForEachRuntime(ISuiteRuntimeEnumerator* enumerator, Visit visit) {
-  if (enumerator == nullptr || FAILED(enumerator->Reset())) return;
+// Every item from the start of the list; a failing Next ends the list like its end does.
+std::vector<SuiteRuntime> ReadRuntimes(ISuiteRuntimeEnumerator* enumerator) {
+  std::vector<SuiteRuntime> runtimes;
+  if (enumerator == nullptr || FAILED(enumerator->Reset())) return runtimes;
   for (;;) {
     long code = 0;
     BSTR version = nullptr;
@@ -37,8 +37,8 @@ void ForEachRuntime(ISuiteRuntimeEnumerator* enumerator, Visit visit) {
     HRESULT hr = enumerator->Next(&code, &version, &detail);
     std::wstring versionText = TakeBstr(version);
     TakeBstr(detail);
-    if (hr != S_OK) return;
-    visit(code, versionText);
+    if (hr != S_OK) return runtimes;
+    runtimes.push_back({code, versionText});
   }
 }
 
@@ -51,46 +51,55 @@ bool ContainsIgnoringCase(const std::vector<std::wstring>& list, const std::wstr
   return false;
 }
 
+bool IsDesktopOrEngine(long productCode) {
+  return productCode == kSuiteRuntimeDesktop || productCode == kSuiteRuntimeEngine;
+}
+
 }  // namespace
 
 std::wstring GetProductVersion() { return kSuiteRelease; }
 
+bool ReadsThe64BitView(const std::wstring& subkey) { return subkey.find(kSkyloftRelease) != std::wstring::npos; }
+
 std::wstring ReadRegistryString(HKEY hive, const std::wstring& subkey, const std::wstring& valueName,
                                 const std::wstring& defaultText) {
-  HKEY key = nullptr;
-  LONG opened = subkey.find(kSkyloftRelease) != std::wstring::npos
-                    ? RegOpenKeyExW(hive, subkey.c_str(), 0, KEY_READ | KEY_WOW64_64KEY, &key)
-                    : RegOpenKeyW(hive, subkey.c_str(), &key);
-  if (opened != ERROR_SUCCESS) return defaultText;
-
+  fw::RegistryKey key;
+  LONG opened;
+  if (ReadsThe64BitView(subkey))
+    opened = key.Open(hive, subkey.c_str(), KEY_READ | KEY_WOW64_64KEY);
+  else
+    opened = key.Open(hive, subkey.c_str());
   std::wstring result = defaultText;
-  DWORD size = 0;
-  LONG status = RegQueryValueExW(key, valueName.c_str(), nullptr, nullptr, nullptr, &size);
-  std::vector<wchar_t> buffer;
-  // A value that keeps growing under the reader is given up on after a few tries.
-  for (int attempt = 0; attempt < 4 && (status == ERROR_SUCCESS || status == ERROR_MORE_DATA); ++attempt) {
-    // Whatever the type, the data is read as UTF-16. Whole zero characters after the data
-    // (also after an odd last byte) end the text even when the value carries no terminator.
-    buffer.assign(size / sizeof(wchar_t) + 2, L'\0');
-    DWORD read = size;
-    status = RegQueryValueExW(key, valueName.c_str(), nullptr, nullptr,
-                              reinterpret_cast<BYTE*>(buffer.data()), &read);
-    if (status == ERROR_SUCCESS) {
-      result.assign(buffer.data(), wcsnlen(buffer.data(), buffer.size()));
-      break;
-    }
-    // The value grew between the two queries: the second one reported the new size.
-    size = read;
-  }
-  if (key != hive) RegCloseKey(key);
+  if (opened == ERROR_SUCCESS) key.ReadString(valueName.c_str(), result);
   return result;
 }
 
-void DetectInstalledProducts(InstalledProducts& products) {
-  products.desktopInstalled = false;
-  products.engineInstalled = false;
-  products.skyloftInstalled = false;
+DetectedProducts DecideInstalledProducts(const std::wstring& version, const DetectionEvidence& evidence) {
+  DetectedProducts detected;
+  // The installers set one marker per machine; when both exist Desktop wins.
+  detected.desktop = evidence.desktopMarkerSet;
+  detected.engine = !evidence.desktopMarkerSet && evidence.engineMarkerSet;
+  // A runtime of another release is not the one this console administers, whatever the
+  // console's own release text says.
+  for (const SuiteRuntime& runtime : evidence.runtimes) {
+    if (runtime.version != version || runtime.version != kSuiteRelease) continue;
+    if (runtime.productCode == kSuiteRuntimeDesktop) detected.desktop = true;
+    if (runtime.productCode == kSuiteRuntimeEngine) detected.engine = true;
+  }
+  detected.skyloft = evidence.skyloftKeyFound;
+  return detected;
+}
 
+std::vector<std::wstring> DistinctRuntimeVersions(const std::vector<SuiteRuntime>& runtimes) {
+  std::vector<std::wstring> versions;
+  for (const SuiteRuntime& runtime : runtimes) {
+    if (IsDesktopOrEngine(runtime.productCode) && !ContainsIgnoringCase(versions, runtime.version))
+      versions.push_back(runtime.version);
+  }
+  return versions;
+}
+
+void DetectInstalledProducts(InstalledProducts& products) {
   const std::wstring version = GetProductVersion();
   products.version = version;
   products.engineKey = ProductKey(kEngineKeyBase, version);
@@ -98,27 +107,20 @@ void DetectInstalledProducts(InstalledProducts& products) {
   products.skyloftKey = kSkyloftKey;
   products.serverKey = ProductKey(kServerKeyBase, version);
 
-  // The installers set one marker per machine; when both exist Desktop wins.
-  if (IsMarkerSet(L"KVEL_DESKTOP" + version + L"_INSTALLED"))
-    products.desktopInstalled = true;
-  else if (IsMarkerSet(L"KVEL_ENGINE" + version + L"_INSTALLED"))
-    products.engineInstalled = true;
-
-  // A runtime of another release is not the one this console administers, whatever the
-  // console's own release text says.
-  ForEachRuntime(products.runtimeEnumerator.Get(), [&](long code, const std::wstring& runtimeVersion) {
-    if (runtimeVersion != version || runtimeVersion != kSuiteRelease) return;
-    if (code == kSuiteRuntimeDesktop) products.desktopInstalled = true;
-    if (code == kSuiteRuntimeEngine) products.engineInstalled = true;
-  });
-
+  DetectionEvidence evidence;
+  evidence.desktopMarkerSet = IsMarkerSet(L"KVEL_DESKTOP" + version + L"_INSTALLED");
+  evidence.engineMarkerSet = IsMarkerSet(L"KVEL_ENGINE" + version + L"_INSTALLED");
+  evidence.runtimes = ReadRuntimes(products.runtimeEnumerator.Get());
   // Skyloft is a 64-bit product: its key counts only in the 64-bit view.
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_LOCAL_MACHINE, products.skyloftKey.c_str(), 0, KEY_QUERY_VALUE | KEY_WOW64_64KEY,
-                    &key) == ERROR_SUCCESS) {
-    products.skyloftInstalled = true;
-    RegCloseKey(key);
-  }
+  fw::RegistryKey skyloft;
+  evidence.skyloftKeyFound =
+      skyloft.Open(HKEY_LOCAL_MACHINE, products.skyloftKey.c_str(), KEY_QUERY_VALUE | KEY_WOW64_64KEY) == ERROR_SUCCESS;
+
+  // serverInstalled is left as it is: no rule detects a Server.
+  const DetectedProducts detected = DecideInstalledProducts(version, evidence);
+  products.desktopInstalled = detected.desktop;
+  products.engineInstalled = detected.engine;
+  products.skyloftInstalled = detected.skyloft;
 }
 
 bool GetInstallDir(int productIndex, std::wstring version, std::wstring& installDir) {
@@ -212,18 +214,13 @@ std::wstring GetCoreProductVersion(const std::wstring& installDir) {
 std::vector<std::wstring> ListInstalledRuntimeVersions(InstalledProducts& products) {
   products.runtimeEnumerator.Reset();
   products.runtimeInfo.Reset();
-  std::vector<std::wstring> versions;
   if (FAILED(CoCreateInstance(CLSID_SuiteRuntimeInfo, nullptr, CLSCTX_INPROC_SERVER,
                               IID_ISuiteRuntimeInfo, products.runtimeInfo.ReceiveVoid())))
-    return versions;  // not installed: detection does without it
+    return {};  // not installed: detection does without it
   OleRun(products.runtimeInfo.Get());
   if (FAILED(products.runtimeInfo->GetEnumerator(products.runtimeEnumerator.Receive()))) {
     products.runtimeEnumerator.Reset();
-    return versions;
+    return {};
   }
-  ForEachRuntime(products.runtimeEnumerator.Get(), [&](long code, const std::wstring& version) {
-    if ((code == kSuiteRuntimeDesktop || code == kSuiteRuntimeEngine) && !ContainsIgnoringCase(versions, version))
-      versions.push_back(version);
-  });
-  return versions;
+  return DistinctRuntimeVersions(ReadRuntimes(products.runtimeEnumerator.Get()));
 }

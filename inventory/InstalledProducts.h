@@ -63,3 +63,34 @@ bool GetInstallDir(int productIndex, std::wstring version, std::wstring& install
 std::wstring GetProductBinFolder(const std::wstring& productKey);
 std::wstring GetCoreProductVersion(const std::wstring& installDir);
 std::vector<std::wstring> ListInstalledRuntimeVersions(InstalledProducts& products);
+
+// The rules behind detection, free of the registry, the environment and COM.
+
+// Keys naming Skyloft's release are read through the 64-bit registry view (case-sensitive).
+bool ReadsThe64BitView(const std::wstring& subkey);
+
+// One runtime as the suite's runtime-information component lists it.
+struct SuiteRuntime {
+  long productCode = 0;
+  std::wstring version;
+};
+
+// What detection looks at.
+struct DetectionEvidence {
+  bool desktopMarkerSet = false;  // KVEL_DESKTOP<version>_INSTALLED exists and is not empty
+  bool engineMarkerSet = false;   // KVEL_ENGINE<version>_INSTALLED likewise
+  std::vector<SuiteRuntime> runtimes;  // in the component's order, up to the first failing item
+  bool skyloftKeyFound = false;        // Skyloft's key opens in the 64-bit view
+};
+
+struct DetectedProducts {
+  bool desktop = false;
+  bool engine = false;
+  bool skyloft = false;
+};
+
+// Desktop wins over Engine among the markers; a runtime counts only in the release version,
+// which must also be the console's own release; Skyloft is its key.
+DetectedProducts DecideInstalledProducts(const std::wstring& version, const DetectionEvidence& evidence);
+// The versions of the Desktop and Engine runtimes, each once (letter case ignored), in order.
+std::vector<std::wstring> DistinctRuntimeVersions(const std::vector<SuiteRuntime>& runtimes);

@@ -9,3 +9,9 @@ bool GetProcessNameList(CString& out);
 void GetRunningSuiteApps(CStringArray& found);
 // "  name\r\n" per running application; false (text untouched) when none runs.
 bool GetRunningSuiteAppsText(CString& text);
+
+// The rules behind them, free of the process snapshot.
+// The watched names that occur in processList (as GetProcessNameList writes it), in table order.
+CStringArray FindSuiteApps(const CString& processList);
+// One line "  name\r\n" per name, in the given order.
+CString RunningAppsText(const CStringArray& names);

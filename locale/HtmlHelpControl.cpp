@@ -1,6 +1,11 @@
 // Late binding to the HTML Help control, so that programs start on systems without it.
-#include "framework/SystemLibrary.h"
 #include "locale/LocaleInternals.h"
+
+#include <htmlhelp.h>
+
+#include "framework/RegistryKey.h"
+#include "framework/ScopedHandle.h"
+#include "framework/SystemLibrary.h"
 
 namespace KVELLocale {
 
@@ -8,23 +13,22 @@ namespace {
 
 using HtmlHelpProc = HWND(WINAPI*)(HWND, LPCWSTR, UINT, DWORD_PTR);
 
-// Kept for the life of the process once found.
-HMODULE g_helpControl = nullptr;
+// Set once a control with the entry is loaded; the control then stays loaded for the rest of
+// the process.
 HtmlHelpProc g_htmlHelp = nullptr;
 
 // The control where its class is registered, so that a relocated installation is honoured.
 HMODULE LoadRegisteredControl() {
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_CLASSES_ROOT,
-                    L"CLSID\\{ADB880A6-D8FF-11CF-9377-00AA003B7A11}\\InprocServer32", 0,
-                    KEY_QUERY_VALUE, &key) != ERROR_SUCCESS)
+  fw::RegistryKey key;
+  if (key.Open(HKEY_CLASSES_ROOT, L"CLSID\\{ADB880A6-D8FF-11CF-9377-00AA003B7A11}\\InprocServer32",
+               KEY_QUERY_VALUE) != ERROR_SUCCESS)
     return nullptr;
   wchar_t path[MAX_PATH + 1] = {};
   DWORD type = 0;
   DWORD size = MAX_PATH * sizeof(wchar_t);  // leaves room for a terminator the data may lack
-  LONG rc = RegQueryValueExW(key, nullptr, nullptr, &type, reinterpret_cast<BYTE*>(path), &size);
-  RegCloseKey(key);
-  if (rc != ERROR_SUCCESS || (type != REG_SZ && type != REG_EXPAND_SZ)) return nullptr;
+  if (RegQueryValueExW(key.Get(), nullptr, nullptr, &type, reinterpret_cast<BYTE*>(path), &size) != ERROR_SUCCESS ||
+      (type != REG_SZ && type != REG_EXPAND_SZ))
+    return nullptr;
   if (type == REG_EXPAND_SZ) {
     wchar_t expanded[MAX_PATH];
     DWORD length = ExpandEnvironmentStringsW(path, expanded, MAX_PATH);
@@ -34,6 +38,10 @@ HMODULE LoadRegisteredControl() {
   return LoadLibraryW(path);
 }
 
+// The system's own copy, by name but only from the system folder: a file of that name beside
+// the program or on the search path is never loaded.
+HMODULE LoadSystemControl() { return fw::LoadSystemLibrary(L"hhctrl.ocx"); }
+
 // The Unicode entry, by name or by its export ordinal.
 HtmlHelpProc FindEntry(HMODULE control) {
   FARPROC entry = GetProcAddress(control, "HtmlHelpW");
@@ -41,25 +49,28 @@ HtmlHelpProc FindEntry(HMODULE control) {
   return reinterpret_cast<HtmlHelpProc>(reinterpret_cast<void*>(entry));
 }
 
+// Keeps control when it has the entry; otherwise it is freed again.
+bool Adopt(fw::ScopedLibrary control) {
+  if (!control) return false;
+  g_htmlHelp = FindEntry(control.Get());
+  if (!g_htmlHelp) return false;
+  control.Release();
+  return true;
+}
+
 bool BindHtmlHelp() {
   if (g_htmlHelp) return true;
-  // A registered control without the entry is no better than none: the control by name is next,
-  // from the system folder only.
-  for (HMODULE control : {LoadRegisteredControl(), fw::LoadSystemLibrary(L"hhctrl.ocx")}) {
-    if (!control) continue;
-    if (HtmlHelpProc entry = FindEntry(control)) {
-      g_helpControl = control;
-      g_htmlHelp = entry;
-      return true;
-    }
-    FreeLibrary(control);
-  }
-  return false;
+  // A registered control without the entry is no better than none: the system's copy is next.
+  // It is only loaded when the registered one fails.
+  return Adopt(fw::ScopedLibrary(LoadRegisteredControl())) || Adopt(fw::ScopedLibrary(LoadSystemControl()));
 }
 
 }  // namespace
 
 HWND CallHtmlHelp(HWND window, const wchar_t* file, UINT command, DWORD_PTR data) {
+  // No help window can be open while no control was ever loaded, so closing them all needs no
+  // control (the console closes help windows at every shutdown).
+  if (command == HH_CLOSE_ALL && !g_htmlHelp) return nullptr;
   if (!BindHtmlHelp()) return nullptr;
   return g_htmlHelp(window, file, command, data);
 }

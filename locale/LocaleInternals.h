@@ -9,8 +9,8 @@ namespace KVELLocale {
 constexpr int kLocaleNameChars = 85;
 constexpr int kLocalePathChars = MAX_PATH;
 
-constexpr LANGID kEnglishUS = 0x0409;
-constexpr LANGID kEnglishNeutral = 0x0009;
+constexpr LANGID kEnglishUS = MAKELANGID(LANG_ENGLISH, SUBLANG_ENGLISH_US);
+constexpr LANGID kEnglishNeutral = MAKELANGID(LANG_ENGLISH, SUBLANG_NEUTRAL);
 
 // The process-wide locale record: zero at load, filled once by InitLocale, never freed.
 // Exported string results point into it.

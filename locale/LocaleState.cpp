@@ -1,10 +1,10 @@
 // The process-wide user locale and UI language, and where their language packs live.
-#include "locale/LocaleInternals.h"
+#include "framework/RegistryKey.h"
+#include "locale/LanguagePacks.h"
 #include "locale/SuiteUserSettings.h"
 
 #include <shlobj.h>
 #include <shlwapi.h>
-#include <strsafe.h>
 
 namespace KVELLocale {
 
@@ -13,11 +13,6 @@ LocaleState g_localeState = {};
 namespace {
 
 LocaleState& s = g_localeState;
-
-// Joins a and b; an overlong result is cleared rather than cut, so that it never counts.
-void Combine(wchar_t (&out)[kLocalePathChars], const wchar_t* a, const wchar_t* b) {
-  if (!PathCombineW(out, a, b)) out[0] = L'\0';
-}
 
 // The running executable's path; false when it cannot be read whole.
 bool GetExecutablePath(wchar_t (&path)[kLocalePathChars]) {
@@ -52,64 +47,23 @@ void FetchLocaleNames(LANGID id, wchar_t (&langName)[kLocaleNameChars],
   }
 }
 
-// A language pack counts only as an existing folder with something in it.
-bool FolderCounts(const wchar_t* folder) {
-  if (folder[0] == L'\0' || !PathIsDirectoryW(folder)) return false;
-  wchar_t pattern[kLocalePathChars];
-  Combine(pattern, folder, L"*");
-  if (pattern[0] == L'\0') return false;
-  WIN32_FIND_DATAW entry;
-  HANDLE find = FindFirstFileW(pattern, &entry);
-  if (find == INVALID_HANDLE_VALUE) return false;
-  bool found = false;
-  do {
-    found = lstrcmpW(entry.cFileName, L".") != 0 && lstrcmpW(entry.cFileName, L"..") != 0;
-  } while (!found && FindNextFileW(find, &entry));
-  FindClose(find);
-  return found;
-}
-
-// Forms <base>\bin\<lang> and <base>\bin\<lang>-<country> and keeps the ones that count.
-// When the language-and-country pack counts both are kept as formed, because callers try that
-// one first anyway. Returns false (both cleared) when no pack counts.
-bool FindLanguagePacks(const wchar_t* base, const wchar_t* langName, const wchar_t* countryName,
-                       wchar_t (&langDir)[kLocalePathChars],
-                       wchar_t (&langCountryDir)[kLocalePathChars]) {
-  wchar_t binDir[kLocalePathChars];
-  Combine(binDir, base, L"bin");
-  bool langOk = false;
-  if (langName[0] != L'\0') {
-    Combine(langDir, binDir, langName);
-    langOk = FolderCounts(langDir);
-  }
-  if (countryName[0] != L'\0') {
-    wchar_t folderName[kLocalePathChars];
-    StringCchPrintfW(folderName, kLocalePathChars, L"%s-%s", langName, countryName);
-    Combine(langCountryDir, binDir, folderName);
-    if (FolderCounts(langCountryDir)) return true;
-  }
-  if (!langOk) langDir[0] = L'\0';
-  langCountryDir[0] = L'\0';
-  return langOk;
-}
-
 bool IsEnglish(LANGID id) { return id == kEnglishUS || id == kEnglishNeutral; }
 
 void InitUserLocale() {
   LANGID id = GetUserDefaultLangID();
-  s.langId = id & 0x3FF;
-  s.countryId = id >> 10;
+  s.langId = PRIMARYLANGID(id);
+  s.countryId = SUBLANGID(id);
   s.langDir[0] = s.langCountryDir[0] = L'\0';
   if (IsEnglish(id)) return;  // English is built in: no names, no packs
   FetchLocaleNames(id, s.langName, s.countryName);
   // The user locale's packs always live under the suite folder, q4.exe included.
   wchar_t base[kLocalePathChars];
   GetSuiteFolder(base);
-  FindLanguagePacks(base, s.langName, s.countryName, s.langDir, s.langCountryDir);
+  ChooseLanguagePacks(base, s.langName, s.countryName, LanguagePackCounts, s.langDir, s.langCountryDir);
 }
 
 LANGID ComposeLangID(unsigned short langId, unsigned short countryId) {
-  return static_cast<LANGID>((countryId << 10) | langId);
+  return static_cast<LANGID>(MAKELANGID(langId, countryId));
 }
 
 // A field of the state as it stands once the state has been computed.
@@ -129,12 +83,9 @@ void GetSuiteFolder(wchar_t (&folder)[kLocalePathChars]) {
 }
 
 bool QuerySettingsValue(const wchar_t* valueName, void* buffer, DWORD size) {
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_CURRENT_USER, kSuiteUserKey, 0, KEY_READ, &key) != ERROR_SUCCESS)
-    return false;
-  LONG rc = RegQueryValueExW(key, valueName, nullptr, nullptr, static_cast<BYTE*>(buffer), &size);
-  RegCloseKey(key);
-  return rc == ERROR_SUCCESS;
+  fw::RegistryKey key;
+  return key.Open(HKEY_CURRENT_USER, kSuiteUserKey, KEY_READ) == ERROR_SUCCESS &&
+         key.ReadBytes(valueName, buffer, size) == ERROR_SUCCESS;
 }
 
 LANGID ReadStoredUILangID() {
@@ -165,19 +116,20 @@ void InitUILocale() {
     s.overridePending = false;
   } else {
     id = DetermineUILangID();
-    s.uiLangId = id & 0x3FF;
-    s.uiCountryId = id >> 10;
+    s.uiLangId = PRIMARYLANGID(id);
+    s.uiCountryId = SUBLANGID(id);
   }
   s.uiLangDir[0] = s.uiLangCountryDir[0] = L'\0';
   if (IsEnglish(id)) return;
   FetchLocaleNames(id, s.uiLangName, s.uiCountryName);
   wchar_t base[kLocalePathChars];
   GetUILanguageBase(base);
-  if (!FindLanguagePacks(base, s.uiLangName, s.uiCountryName, s.uiLangDir, s.uiLangCountryDir)) {
+  if (!ChooseLanguagePacks(base, s.uiLangName, s.uiCountryName, LanguagePackCounts, s.uiLangDir,
+                           s.uiLangCountryDir)) {
     // No pack: show English, but keep the requested names so that translated help is still
     // found for a language whose resources are not installed.
-    s.uiLangId = kEnglishUS & 0x3FF;
-    s.uiCountryId = kEnglishUS >> 10;
+    s.uiLangId = PRIMARYLANGID(kEnglishUS);
+    s.uiCountryId = SUBLANGID(kEnglishUS);
   }
 }
 
@@ -191,8 +143,8 @@ KVEL_LOCALE_API bool SetupEXEOverRide(unsigned short langId) {
   if (s.uiLangId != 0 || s.uiCountryId != 0) return false;
   if (!IsValidLangID(langId)) return false;
   s.overridePending = true;
-  s.uiLangId = langId & 0x3FF;
-  s.uiCountryId = langId >> 10;
+  s.uiLangId = PRIMARYLANGID(langId);
+  s.uiCountryId = SUBLANGID(langId);
   return true;
 }
 

@@ -1,5 +1,5 @@
 // Finding and loading a module's localized resource library in the UI language's pack folder.
-#include "locale/LocaleInternals.h"
+#include "locale/LanguagePacks.h"
 
 #include <shlwapi.h>
 #include <strsafe.h>
@@ -16,10 +16,6 @@ HINSTANCE LoadFromFolder(const wchar_t* folder, const wchar_t* fileName) {
   return LoadLibraryW(path);
 }
 
-bool HasExtension(const wchar_t* extension, const wchar_t* wanted) {
-  return _wcsnicmp(extension, wanted, 4) == 0;
-}
-
 }  // namespace
 
 KVEL_LOCALE_API HINSTANCE LoadLocalizedRes(HINSTANCE module) {
@@ -30,16 +26,10 @@ KVEL_LOCALE_API HINSTANCE LoadLocalizedRes(HINSTANCE module) {
   // A short (8.3) path would give a short resource library name.
   wchar_t longPath[kLocalePathChars];
   length = GetLongPathNameW(path, longPath, kLocalePathChars);
-  if (length > 0 && length < static_cast<DWORD>(kLocalePathChars))
-    StringCchCopyW(path, kLocalePathChars, longPath);
-  // Programs and controls keep their translations in a .dll; libraries keep their own extension.
-  const wchar_t* extension = PathFindExtensionW(path);
-  if (HasExtension(extension, L".exe") || HasExtension(extension, L".ocx"))
-    PathRenameExtensionW(path, L".dll");
-  wchar_t resourceName[kLocalePathChars];
-  if (FAILED(StringCchPrintfW(resourceName, kLocalePathChars, L"Res%s", PathFindFileNameW(path))))
-    return nullptr;
-  return LoadLocalizedResFromFile(resourceName);
+  if (length > 0 && length < static_cast<DWORD>(kLocalePathChars)) StringCchCopyW(path, kLocalePathChars, longPath);
+  const std::wstring resourceName = ResourceLibraryName(path);
+  if (resourceName.empty()) return nullptr;
+  return LoadLocalizedResFromFile(resourceName.c_str());
 }
 
 KVEL_LOCALE_API HINSTANCE LoadLocalizedResFromFile(const wchar_t* fileName) {

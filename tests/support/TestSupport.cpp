@@ -69,6 +69,19 @@ void ScopedRegistryKey::DeleteValue(const wchar_t* name) {
   RegCloseKey(key);
 }
 
+void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value) {
+  SetValue(root, path, 0, name, REG_SZ, value.c_str(), static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
+}
+
+void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value) {
+  SetValue(root, path, 0, name, REG_DWORD, &value, sizeof value);
+}
+
+void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, DWORD type, const void* data,
+                      DWORD size) {
+  SetValue(root, path, 0, name, type, data, size);
+}
+
 bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value) {
   DWORD type = 0, size = sizeof value;
   return RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, &type, &value, &size) == ERROR_SUCCESS &&

@@ -45,6 +45,13 @@ class ScopedHiveOverride {
   HKEY machine_ = nullptr;
 };
 
+// Write a value, creating its key and the key's parents. Meant for tests under
+// ScopedHiveOverride, where nothing written needs removing afterwards.
+void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value);
+void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value);
+void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, DWORD type, const void* data,
+                      DWORD size);
+
 // Reads a DWORD value; false when the key or value is missing or not a DWORD.
 bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
 

@@ -9,6 +9,7 @@ int main(int argc, char** argv) {
   if (argc != 4) return 2;
   HANDLE parent = OpenProcess(SYNCHRONIZE, FALSE, std::strtoul(argv[2], nullptr, 10));
   if (HANDLE started = OpenSemaphoreA(SEMAPHORE_MODIFY_STATE, FALSE, argv[1])) ReleaseSemaphore(started, 1, nullptr);
-  if (parent) WaitForSingleObject(parent, std::strtoul(argv[3], nullptr, 10));
-  return parent ? 0 : 1;
+  if (!parent) return 1;
+  WaitForSingleObject(parent, std::strtoul(argv[3], nullptr, 10));
+  return 0;
 }
