@@ -1,7 +1,5 @@
 #include "settings/AdvancedSettings.h"
 
-#include <commctrl.h>
-
 #include "framework/RegistryKey.h"
 #include "inventory/AdminSession.h"
 #include "inventory/RunningSuiteApps.h"
@@ -38,30 +36,23 @@ bool ProbeMachineWrite() {
   return true;
 }
 
-// The per-user portal settings key, created when missing; null when it cannot be.
-HKEY OpenConnectionSettings() {
-  HKEY key = nullptr;
-  if (RegCreateKeyExW(HKEY_CURRENT_USER, kConnectionSettingsKey, 0, nullptr, 0, KEY_READ | KEY_WRITE, nullptr, &key,
-                      nullptr) != ERROR_SUCCESS)
-    return nullptr;
-  return key;
+// The per-user portal settings key with read and write access, created when missing.
+LONG OpenConnectionSettings(fw::RegistryKey& key) {
+  return key.Create(HKEY_CURRENT_USER, kConnectionSettingsKey, KEY_READ | KEY_WRITE);
 }
 
 void WriteSupportLocalPortal(DWORD supported) {
-  HKEY key = OpenConnectionSettings();
-  if (key == nullptr) return;
-  DWORD value = supported != 0 ? 1 : 0;
-  RegSetValueExW(key, kSupportLocalPortalValue, 0, REG_DWORD, reinterpret_cast<const BYTE*>(&value), sizeof value);
-  RegCloseKey(key);
+  fw::RegistryKey key;
+  if (OpenConnectionSettings(key) != ERROR_SUCCESS) return;
+  key.WriteDword(kSupportLocalPortalValue, supported != 0 ? 1 : 0);
 }
 
 }  // namespace
 
 void DeleteStoredUILangID() {
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(HKEY_CURRENT_USER, kSuiteUserKey, 0, KEY_SET_VALUE, &key) != ERROR_SUCCESS) return;
-  RegDeleteValueW(key, kUILangIDValue);
-  RegCloseKey(key);
+  fw::RegistryKey key;
+  if (key.Open(HKEY_CURRENT_USER, kSuiteUserKey, KEY_SET_VALUE) != ERROR_SUCCESS) return;
+  key.DeleteValue(kUILangIDValue);
 }
 
 void StoreUILangID(DWORD langId) {
@@ -76,19 +67,14 @@ DWORD ReadEnableKuei(const InstalledProducts& products) {
 }
 
 DWORD ReadSupportLocalPortal() {
+  // Any value of at most 4 bytes counts, whatever its type; a failed read leaves 0.
   DWORD value = 0;
-  if (HKEY key = OpenConnectionSettings()) {
-    DWORD size = sizeof value;
-    if (RegQueryValueExW(key, kSupportLocalPortalValue, nullptr, nullptr, reinterpret_cast<BYTE*>(&value), &size) !=
-        ERROR_SUCCESS)
-      value = 0;
-    RegCloseKey(key);
-  }
+  fw::RegistryKey key;
+  if (OpenConnectionSettings(key) == ERROR_SUCCESS) key.ReadDword(kSupportLocalPortalValue, value);
   return LocalPortalSupportFromValue(value);
 }
 
 void PersistAdvancedSettings(AdminSession& mainDlg) {
-  // The link control's class is registered at start-up with the others.
   // Without a parent the box belongs to the main window, as every box of the program does.
   CClientMaporaAdvancedConfigDlg dlg;
   dlg.m_pMainDlg = &mainDlg;
