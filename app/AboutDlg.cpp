@@ -30,15 +30,15 @@ ServicePackTexts ServicePackFieldTexts(const CString& name, const CString& recor
   ServicePackTexts texts;
   if (name.empty()) return texts;
   texts.servicePack = name;
-  if (!recordedBuild.empty()) texts.build = fw::FormatMessageText(buildFormat, {NormalizeServicePackBuild(recordedBuild)});
+  if (!recordedBuild.empty())
+    texts.build = fw::FormatMessageText(buildFormat, {NormalizeServicePackBuild(recordedBuild)});
   return texts;
 }
 
 void LoadInstalledServicePack(CAboutDlg& about) {
   const std::wstring desktopKey = ProductKey(kDesktopKeyBase, GetProductVersion());
-  const ServicePackTexts texts =
-      ServicePackFieldTexts(ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPDisplayName", L""),
-                            ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPBuild", L""),
-                            fw::LoadString(IDS_BUILD_FORMAT));
+  const ServicePackTexts texts = ServicePackFieldTexts(
+      ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPDisplayName", L""),
+      ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPBuild", L""), fw::LoadString(IDS_BUILD_FORMAT));
   about.SetServicePackInfo(texts.servicePack, texts.build);
 }

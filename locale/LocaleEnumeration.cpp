@@ -92,7 +92,8 @@ bool ReadLocaleIsoNames(LANGID langId, LocaleIsoNames& names) {
   names.langId = langId;
   if (!ReadLocaleText(langId, LOCALE_SISO639LANGNAME, names.language)) return false;
   std::wstring country;
-  if (ReadLocaleText(langId, LOCALE_SISO3166CTRYNAME, country)) names.languageAndCountry = names.language + L"-" + country;
+  if (ReadLocaleText(langId, LOCALE_SISO3166CTRYNAME, country))
+    names.languageAndCountry = names.language + L"-" + country;
   return true;
 }
 

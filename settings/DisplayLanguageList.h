@@ -20,8 +20,8 @@ inline constexpr int kEnglishEntry = 1;
 
 // A folder of a product's bin folder whose name names a supported locale.
 struct LanguagePackFolder {
-  CString name;    // as found: "de", "de-AT"
-  LANGID langId;   // what the name stands for: 0x0007, 0x0C07
+  CString name;   // as found: "de", "de-AT"
+  LANGID langId;  // what the name stands for: 0x0007, 0x0C07
   // The native language name, with the native country in brackets for a whole locale:
   // "Deutsch", "Deutsch (Österreich)". None when the system has no name for the language.
   std::optional<CString> entryText;

@@ -79,17 +79,17 @@ constexpr wchar_t kBuildFormat[] = L"(Build %1)";
 
 INSTANTIATE_TEST_SUITE_P(
     Recorded, ServicePackFields,
-    testing::Values(
-        ServicePackRow{"NothingRecorded", L"", L"", kBuildFormat, L"", L""},
-        ServicePackRow{"BuildWithoutNameShowsNothing", L"", L"1.6491", kBuildFormat, L"", L""},
-        ServicePackRow{"NameWithoutBuild", L"Service Pack 1", L"", kBuildFormat, L"Service Pack 1", L""},
-        ServicePackRow{"ServicePackDotBuild", L"Service Pack 1", L"1.6491", kBuildFormat, L"Service Pack 1",
-                       L"(Build 6491)"},
-        ServicePackRow{"EveryDotAfterTheFirstGoes", L"SP", L"10.5.6491", kBuildFormat, L"SP", L"(Build 56491)"},
-        ServicePackRow{"BuildWithoutDotKept", L"SP", L"6491", kBuildFormat, L"SP", L"(Build 6491)"},
-        ServicePackRow{"DotAloneLeavesNothing", L"SP", L".", kBuildFormat, L"SP", L"(Build )"},
-        ServicePackRow{"InsertsInTheBuildStayText", L"SP", L"x.%1%2", kBuildFormat, L"SP", L"(Build %1%2)"},
-        ServicePackRow{"NoFormatNoBuild", L"SP", L"1.6491", L"", L"SP", L""}),
+    testing::Values(ServicePackRow{"NothingRecorded", L"", L"", kBuildFormat, L"", L""},
+                    ServicePackRow{"BuildWithoutNameShowsNothing", L"", L"1.6491", kBuildFormat, L"", L""},
+                    ServicePackRow{"NameWithoutBuild", L"Service Pack 1", L"", kBuildFormat, L"Service Pack 1", L""},
+                    ServicePackRow{"ServicePackDotBuild", L"Service Pack 1", L"1.6491", kBuildFormat, L"Service Pack 1",
+                                   L"(Build 6491)"},
+                    ServicePackRow{"EveryDotAfterTheFirstGoes", L"SP", L"10.5.6491", kBuildFormat, L"SP",
+                                   L"(Build 56491)"},
+                    ServicePackRow{"BuildWithoutDotKept", L"SP", L"6491", kBuildFormat, L"SP", L"(Build 6491)"},
+                    ServicePackRow{"DotAloneLeavesNothing", L"SP", L".", kBuildFormat, L"SP", L"(Build )"},
+                    ServicePackRow{"InsertsInTheBuildStayText", L"SP", L"x.%1%2", kBuildFormat, L"SP", L"(Build %1%2)"},
+                    ServicePackRow{"NoFormatNoBuild", L"SP", L"1.6491", L"", L"SP", L""}),
     [](const testing::TestParamInfo<ServicePackRow>& info) { return std::string(info.param.name); });
 
 TEST(AboutBox, ReadsTheDesktopServicePackFromTheRegistry) {

@@ -114,7 +114,8 @@ class Process {
 
   // The process's main window: the visible top-level window with the page tree.
   HWND WaitForMainWindow() const {
-    return WaitForTopLevel([this](HWND window) { return Shows(window) && GetDlgItem(window, IDC_PAGE_TREE) != nullptr; });
+    return WaitForTopLevel(
+        [this](HWND window) { return Shows(window) && GetDlgItem(window, IDC_PAGE_TREE) != nullptr; });
   }
 
   // A visible top-level window of the process other than the main window, with that caption: a

@@ -102,8 +102,9 @@ TEST(AdvancedConfiguration, ListsThePacksAndSavesTheChoices) {
   EXPECT_EQ(e2e::ComboText(list, 1), L"English");
   EXPECT_EQ(e2e::ComboText(list, 2), L"Deutsch (\u00d6sterreich)");
   EXPECT_TRUE(IsWindowVisible(warning));
-  EXPECT_EQ(Text(warning),
-            L"Warning: Mapora Deutsch language pack is not available on your system, Mapora UI will display as English.");
+  EXPECT_EQ(
+      Text(warning),
+      L"Warning: Mapora Deutsch language pack is not available on your system, Mapora UI will display as English.");
   EXPECT_TRUE(e2e::Screenshot(dialog, "advanced-config"));
 
   e2e::SelectCombo(list, 2);
@@ -215,16 +216,15 @@ TEST_P(LanguagePack, DecidesTheConsolesLanguageAndLayout) {
 
 INSTANTIATE_TEST_SUITE_P(
     Packs, LanguagePack,
-    testing::Values(
-        LanguagePackRow{"French", L"fr", L"/Lang 1036", L"Administrateur Mapora",
-                        L"Informations de configuration de Mapora :", false, "console-fr"},
-        LanguagePackRow{"Japanese", L"ja", L"-lang 1041", L"Mapora 管理ツール", L"Mapora の構成情報:", false,
-                        "console-ja"},
-        // Arabic (Saudi Arabia) has no ar-SA folder and takes the language folder.
-        LanguagePackRow{"Arabic", L"ar", L"/Lang 1025", L"أداة إدارة Mapora", L"معلومات تكوين Mapora:", true,
-                        "console-ar"},
-        LanguagePackRow{"GermanWithoutPack", L"fr", L"/Lang 1031", L"Mapora Administrator",
-                        L"Mapora Configuration Information:", false, nullptr}),
+    testing::Values(LanguagePackRow{"French", L"fr", L"/Lang 1036", L"Administrateur Mapora",
+                                    L"Informations de configuration de Mapora :", false, "console-fr"},
+                    LanguagePackRow{"Japanese", L"ja", L"-lang 1041", L"Mapora 管理ツール", L"Mapora の構成情報:",
+                                    false, "console-ja"},
+                    // Arabic (Saudi Arabia) has no ar-SA folder and takes the language folder.
+                    LanguagePackRow{"Arabic", L"ar", L"/Lang 1025", L"أداة إدارة Mapora", L"معلومات تكوين Mapora:",
+                                    true, "console-ar"},
+                    LanguagePackRow{"GermanWithoutPack", L"fr", L"/Lang 1031", L"Mapora Administrator",
+                                    L"Mapora Configuration Information:", false, nullptr}),
     [](const testing::TestParamInfo<LanguagePackRow>& info) { return std::string(info.param.name); });
 
 // Help opens the help file under the Desktop product's folder, translated where the pack's
@@ -245,8 +245,8 @@ TEST_P(Help, OpensTheHelpFileOfTheConsolesLanguage) {
   ScopedDirectory desktop(testing_support::ModuleFolder() + L"\\e2e-help-desktop");
   ScopedRegistryKey desktopKey(HKEY_LOCAL_MACHINE, kDesktopKey);
   desktopKey.SetString(L"InstallDir", desktop.Path() + L"\\");
-  ASSERT_TRUE(testing_support::CopyFileTo(e2e::WindowsPath(MAPORA_PACKS_DIR) + L"\\fr" + kPackFile,
-                                          pack.Path() + kPackFile));
+  ASSERT_TRUE(
+      testing_support::CopyFileTo(e2e::WindowsPath(MAPORA_PACKS_DIR) + L"\\fr" + kPackFile, pack.Path() + kPackFile));
   for (const wchar_t* language : {L"", L"\\fr"}) {
     ASSERT_TRUE(testing_support::CopyFileTo(e2e::WindowsPath(MAPORA_HELP_DIR) + language + kHelpFile,
                                             desktop.Path() + L"\\help" + language + kHelpFile));

@@ -139,8 +139,9 @@ TEST_F(AdvancedConfiguration, ListsTheFixedEntriesAndThePack) {
     }
   });
 
-  const std::vector<std::pair<std::wstring, DWORD>> expected = {
-      {L"Display language (English - United States)", 0}, {L"English", 9}, {L"Deutsch (\u00d6sterreich)", kGermanAustria}};
+  const std::vector<std::pair<std::wstring, DWORD>> expected = {{L"Display language (English - United States)", 0},
+                                                                {L"English", 9},
+                                                                {L"Deutsch (\u00d6sterreich)", kGermanAustria}};
   EXPECT_EQ(entries, expected);
 }
 
@@ -272,12 +273,11 @@ TEST_P(LocalPortal, CountsOnlyExactlyOneAndSaveWritesZeroOrOne) {
   EXPECT_EQ(Stored(HKEY_CURRENT_USER, kConnectionSettingsKey, kSupportLocalPortalValue), row.saved);
 }
 
-INSTANTIATE_TEST_SUITE_P(StoredValues, LocalPortal,
-                         testing::Values(LocalPortalRow{"Absent", kAbsent, false, false, 0},
-                                         LocalPortalRow{"One", 1, false, true, 1},
-                                         LocalPortalRow{"Two", 2, false, false, 0},
-                                         LocalPortalRow{"TwoClicked", 2, true, false, 1}),
-                         [](const testing::TestParamInfo<LocalPortalRow>& info) { return std::string(info.param.name); });
+INSTANTIATE_TEST_SUITE_P(
+    StoredValues, LocalPortal,
+    testing::Values(LocalPortalRow{"Absent", kAbsent, false, false, 0}, LocalPortalRow{"One", 1, false, true, 1},
+                    LocalPortalRow{"Two", 2, false, false, 0}, LocalPortalRow{"TwoClicked", 2, true, false, 1}),
+    [](const testing::TestParamInfo<LocalPortalRow>& info) { return std::string(info.param.name); });
 
 TEST_F(AdvancedConfiguration, OpeningCreatesThePortalSettingsKey) {
   Run(IDCANCEL);
@@ -321,8 +321,9 @@ TEST_F(GermanWindows, IsNamedAndWarnedAboutWhileItsEntryIsSelected) {
   });
 
   EXPECT_EQ(windowsEntry, L"Display language (Deutsch - Deutschland)");
-  EXPECT_EQ(warning,
-            L"Warning: Mapora Deutsch language pack is not available on your system, Mapora UI will display as English.");
+  EXPECT_EQ(
+      warning,
+      L"Warning: Mapora Deutsch language pack is not available on your system, Mapora UI will display as English.");
   EXPECT_EQ(warningShown, std::vector<bool>({true, false, true}));
 }
 

@@ -81,16 +81,18 @@ INSTANTIATE_TEST_SUITE_P(
         ListingRow{"DesktopBeforeEngineInFoundOrder",
                    {{kFrenchPack, kAustrianPack}, {Pack(L"ja", 0x0011, L"\u65e5\u672c\u8a9e")}},
                    {{L"fran\u00e7ais", kFrench}, {kAustrianGerman, kGermanAustria}, {L"\u65e5\u672c\u8a9e", 0x0011}}},
-        ListingRow{"SamePackUnderBothProductsOnce", {{kAustrianPack}, {kAustrianPack}}, {{kAustrianGerman, kGermanAustria}}},
+        ListingRow{
+            "SamePackUnderBothProductsOnce", {{kAustrianPack}, {kAustrianPack}}, {{kAustrianGerman, kGermanAustria}}},
         ListingRow{"SameTextIgnoringCaseOnce",
                    {{kAustrianPack, Pack(L"de-at", kGermanAustria, L"DEUTSCH (\u00d6STERREICH)")}},
                    {{kAustrianGerman, kGermanAustria}}},
         ListingRow{"EnglishPackIsTheFixedEnglishEntry", {{Pack(L"en", 0x0009, L"English")}}, {}},
-        ListingRow{"EnglishUSOncePerFolder",
-                   {{kEnglishUSPack}, {kEnglishUSPack, Pack(L"EN-us", kEnglishUnitedStates, L"english (united states)")}},
-                   {{kEnglishUS, kEnglishUnitedStates},
-                    {kEnglishUS, kEnglishUnitedStates},
-                    {L"english (united states)", kEnglishUnitedStates}}},
+        ListingRow{
+            "EnglishUSOncePerFolder",
+            {{kEnglishUSPack}, {kEnglishUSPack, Pack(L"EN-us", kEnglishUnitedStates, L"english (united states)")}},
+            {{kEnglishUS, kEnglishUnitedStates},
+             {kEnglishUS, kEnglishUnitedStates},
+             {L"english (united states)", kEnglishUnitedStates}}},
         ListingRow{"PackWithoutNativeNameNotListed", {{LanguagePackFolder{L"qps-ploc", 0x0501, std::nullopt}}}, {}}),
     [](const testing::TestParamInfo<ListingRow>& info) { return std::string(info.param.name); });
 
@@ -164,19 +166,18 @@ TEST_P(WindowsLanguagePack, IsFoundOnlyInTheLastScannedProduct) {
 
 INSTANTIATE_TEST_SUITE_P(
     Folders, WindowsLanguagePack,
-    testing::Values(
-        PackFoundRow{"EnglishUSNeedsNoPack", L"en-US", {{}}, true},
-        PackFoundRow{"NothingScannedWithoutProducts", L"en-US", {}, false},
-        PackFoundRow{"CountryPack", L"de-DE", {{L"fr-FR", L"de-DE"}}, true},
-        PackFoundRow{"FolderCaseIgnored", L"de-DE", {{L"DE-de"}}, true},
-        PackFoundRow{"LanguagePackServesEveryCountry", L"de-DE", {{L"de"}}, true},
-        PackFoundRow{"OtherCountryDoesNotServe", L"de-DE", {{L"de-AT"}}, false},
-        PackFoundRow{"EngineScanForgetsTheDesktopPack", L"de-DE", {{L"de-DE"}, {L"fr-FR"}}, false},
-        // Any language-only folder shortens the name for the rest of the build.
-        PackFoundRow{"ShortenedNameMissesACountryPack", L"de-DE", {{L"ja"}, {L"de-DE"}}, false},
-        PackFoundRow{"ShortenedNameFindsALanguagePack", L"de-DE", {{L"ja"}, {L"de"}}, true},
-        PackFoundRow{"ShortenedEnglishIsNoLongerEnglishUS", L"en-US", {{L"ja"}, {L"de-AT"}}, false},
-        PackFoundRow{"UnknownWindowsLanguage", L"", {{L"de", L"de-DE"}}, false}),
+    testing::Values(PackFoundRow{"EnglishUSNeedsNoPack", L"en-US", {{}}, true},
+                    PackFoundRow{"NothingScannedWithoutProducts", L"en-US", {}, false},
+                    PackFoundRow{"CountryPack", L"de-DE", {{L"fr-FR", L"de-DE"}}, true},
+                    PackFoundRow{"FolderCaseIgnored", L"de-DE", {{L"DE-de"}}, true},
+                    PackFoundRow{"LanguagePackServesEveryCountry", L"de-DE", {{L"de"}}, true},
+                    PackFoundRow{"OtherCountryDoesNotServe", L"de-DE", {{L"de-AT"}}, false},
+                    PackFoundRow{"EngineScanForgetsTheDesktopPack", L"de-DE", {{L"de-DE"}, {L"fr-FR"}}, false},
+                    // Any language-only folder shortens the name for the rest of the build.
+                    PackFoundRow{"ShortenedNameMissesACountryPack", L"de-DE", {{L"ja"}, {L"de-DE"}}, false},
+                    PackFoundRow{"ShortenedNameFindsALanguagePack", L"de-DE", {{L"ja"}, {L"de"}}, true},
+                    PackFoundRow{"ShortenedEnglishIsNoLongerEnglishUS", L"en-US", {{L"ja"}, {L"de-AT"}}, false},
+                    PackFoundRow{"UnknownWindowsLanguage", L"", {{L"de", L"de-DE"}}, false}),
     [](const testing::TestParamInfo<PackFoundRow>& info) { return std::string(info.param.name); });
 
 struct WarningRow {

@@ -89,7 +89,7 @@ TEST(LocaleNameCatalog, UnknownNameGivesZero) {
 TEST(LocaleNameCatalog, ResolvesEveryNameAsTheLocaleWalkDoes) {
   const LocaleNameCatalog catalog = LocaleNameCatalog::FromSystem();
   ASSERT_FALSE(catalog.Locales().empty());
-  const wchar_t* names[] = {L"fr", L"fr-CA", L"PT-br", L"de",  L"de-AT", L"en",    L"en-US", L"zh-CN",
+  const wchar_t* names[] = {L"fr", L"fr-CA", L"PT-br", L"de",  L"de-AT", L"en",      L"en-US", L"zh-CN",
                             L"sr", L"ar-SA", L"xx",    L"fr-", L"",      L"de-DE-x", L"-DE"};
   for (const wchar_t* name : names) {
     unsigned short fromCatalog = kUntouched;
