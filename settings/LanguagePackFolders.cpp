@@ -1,6 +1,7 @@
 #include "settings/LanguagePackFolders.h"
 
 #include <map>
+#include <utility>
 
 #include "framework/ScopedHandle.h"
 #include "inventory/InstalledProducts.h"
