@@ -6,8 +6,6 @@
 
 CAboutDlg::CAboutDlg() : CDialog(IDD_ABOUTBOX) {}
 
-CAboutDlg::~CAboutDlg() = default;
-
 void CAboutDlg::SetServicePackInfo(const CString& servicePack, const CString& build) {
   m_strServicePack = servicePack;
   m_strServicePackBuild = build;
@@ -19,11 +17,6 @@ void CAboutDlg::DoDataExchange(CDataExchange* pDX) {
   DDX_Text(pDX, IDC_SERVICE_PACK_BUILD, m_strServicePackBuild);
 }
 
-const MessageMap* CAboutDlg::GetMessageMap() const {
-  static const MessageMap map = {CDialog::GetMessageMap(), nullptr, 0};
-  return &map;
-}
-
 CString NormalizeServicePackBuild(const CString& build) {
   size_t dot = build.find(L'.');
   if (dot == CString::npos) return build;
@@ -33,13 +26,19 @@ CString NormalizeServicePackBuild(const CString& build) {
   return digits;
 }
 
+ServicePackTexts ServicePackFieldTexts(const CString& name, const CString& recordedBuild, const CString& buildFormat) {
+  ServicePackTexts texts;
+  if (name.empty()) return texts;
+  texts.servicePack = name;
+  if (!recordedBuild.empty())
+    texts.build = fw::FormatMessageText(buildFormat, {NormalizeServicePackBuild(recordedBuild)});
+  return texts;
+}
+
 void LoadInstalledServicePack(CAboutDlg& about) {
   const std::wstring desktopKey = ProductKey(kDesktopKeyBase, GetProductVersion());
-  CString servicePack = ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPDisplayName", L"");
-  CString buildText;
-  if (!servicePack.empty()) {
-    CString build = ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPBuild", L"");
-    if (!build.empty()) buildText = fw::FormatMessageString(IDS_BUILD_FORMAT, {NormalizeServicePackBuild(build)});
-  }
-  about.SetServicePackInfo(servicePack, buildText);
+  const ServicePackTexts texts = ServicePackFieldTexts(
+      ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPDisplayName", L""),
+      ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPBuild", L""), fw::LoadString(IDS_BUILD_FORMAT));
+  about.SetServicePackInfo(texts.servicePack, texts.build);
 }

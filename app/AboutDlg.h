@@ -7,7 +7,6 @@
 class CAboutDlg : public CDialog {
  public:
   CAboutDlg();
-  ~CAboutDlg() override;
 
   void SetServicePackInfo(const CString& servicePack, const CString& build);
 
@@ -16,13 +15,22 @@ class CAboutDlg : public CDialog {
 
  protected:
   void DoDataExchange(CDataExchange* pDX) override;
-  const MessageMap* GetMessageMap() const override;
 };
 
 // The installers record a service pack's build as "<sp>.<build>": everything from the first "."
 // on, without the dots ("2.6491" -> "6491", "10.5.6491" -> "56491"). Text without "." is kept.
 CString NormalizeServicePackBuild(const CString& build);
 
-// Fills the box with the Desktop product's service pack name and "(Build n)" from the registry;
-// both stay empty when no service pack is recorded.
+// What the box's two service-pack fields show.
+struct ServicePackTexts {
+  CString servicePack;
+  CString build;
+};
+
+// From the recorded name and build (SPDisplayName, SPBuild) and the build field's format
+// ("(Build %1)", with the system's message inserts): no name shows nothing at all, no build (or no
+// format) leaves the build field empty, and a build fills the format with its normalized text.
+ServicePackTexts ServicePackFieldTexts(const CString& name, const CString& recordedBuild, const CString& buildFormat);
+
+// Fills the box from the Desktop product's registry key, read afresh.
 void LoadInstalledServicePack(CAboutDlg& about);

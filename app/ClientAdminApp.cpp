@@ -14,13 +14,12 @@ constexpr DWORD kMessagePendingDelayMs = 45000;
 
 }  // namespace
 
-CClientAdminApp::~CClientAdminApp() = default;
-
 BOOL CClientAdminApp::InitInstance() {
   CMDACommandLineInfo commandLine;
   ParseCommandLine(commandLine);
 
-  if (!commandLine.m_strLang.empty()) KVELLocale::SetupEXEOverRide(LangIdFromText(commandLine.m_strLang));
+  unsigned short forcedLanguage = 0;
+  if (commandLine.LanguageOverride(forcedLanguage)) KVELLocale::SetupEXEOverRide(forcedLanguage);
 
   // From here on every string, template and image comes from the localized library, if any.
   HINSTANCE localized = KVELLocale::LoadLocalizedRes(m_hInstance);

@@ -6,8 +6,6 @@
 
 class CClientAdminApp : public CWinApp {
  public:
-  ~CClientAdminApp() override;
-
   BOOL InitInstance() override;
   // The Help command goes to the framework's default help handler.
   bool OnCmdMsg(UINT id) override;

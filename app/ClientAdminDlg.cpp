@@ -43,8 +43,6 @@ CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG,
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
 }
 
-CClientAdminDlg::~CClientAdminDlg() = default;
-
 void CClientAdminDlg::DoDataExchange(CDataExchange* pDX) {
   CDialog::DoDataExchange(pDX);
   DDX_Control(pDX, IDC_PAGE_TREE, m_wndTree);

@@ -17,7 +17,6 @@
 class CClientAdminDlg : public CDialog, public AdminSession {
  public:
   explicit CClientAdminDlg(CWnd* parent = nullptr);
-  ~CClientAdminDlg() override;
 
   // Enables the Apply button; offered to the pages.
   void EnableApply() override;

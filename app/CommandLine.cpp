@@ -35,6 +35,12 @@ void CMDACommandLineInfo::ParseParam(const wchar_t* param, BOOL isFlag, BOOL isL
   ParseLast(isLast);
 }
 
+bool CMDACommandLineInfo::LanguageOverride(unsigned short& langId) const {
+  if (m_strLang.empty()) return false;
+  langId = LangIdFromText(m_strLang);
+  return true;
+}
+
 unsigned short LangIdFromText(const CString& text) {
   long value = std::wcstol(text.c_str(), nullptr, 10);
   return static_cast<unsigned short>(static_cast<unsigned long>(value) & 0xFFFFu);

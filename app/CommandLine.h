@@ -7,6 +7,8 @@
 class CMDACommandLineInfo : public CCommandLineInfo {
  public:
   void ParseParam(const wchar_t* param, BOOL isFlag, BOOL isLast) override;
+  // The display language forced for this run: true, with its LANGID, once Lang has had a value.
+  bool LanguageOverride(unsigned short& langId) const;
 
   CString m_strLang;  // the text given after "Lang"; empty when the option was not given
   int m_nExpect = 0;  // what the next plain argument is: 0 nothing, 1 the Lang value

@@ -64,7 +64,10 @@ CString FormatString(UINT id, ...) {
 }
 
 CString FormatMessageString(UINT id, const std::vector<CString>& inserts) {
-  CString format = LoadString(id);
+  return FormatMessageText(LoadString(id), inserts);
+}
+
+CString FormatMessageText(const CString& format, const std::vector<CString>& inserts) {
   if (format.empty()) return CString();
   std::vector<DWORD_PTR> args;
   for (const CString& insert : inserts) args.push_back(reinterpret_cast<DWORD_PTR>(insert.c_str()));

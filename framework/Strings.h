@@ -30,6 +30,8 @@ CString FormatString(UINT id, ...);
 // String-table entry id with "%1".."%9" inserts filled by the system's message formatting;
 // empty when the entry is missing.
 CString FormatMessageString(UINT id, const std::vector<CString>& inserts);
+// The same for a format already loaded; empty for an empty format.
+CString FormatMessageText(const CString& format, const std::vector<CString>& inserts);
 
 CString ToUpper(const CString& text);
 

@@ -1,7 +1,6 @@
 // Matching LANGIDs and language-pack folder names against the system's supported locales.
 #include "locale/LocaleInternals.h"
-
-#include <strsafe.h>
+#include "locale/LocaleNameCatalog.h"
 
 #include <cwchar>
 
@@ -11,32 +10,37 @@ namespace {
 
 LocaleState& s = g_localeState;
 
+// The LANGID of one entry of the system's enumeration; false for an entry that ends it (no
+// hexadecimal number, or one whose LANGID is 0).
+bool ParseLocaleString(const wchar_t* localeString, LANGID& id) {
+  unsigned int value = 0;
+  if (!localeString || swscanf(localeString, L"%x", &value) != 1) return false;
+  id = LOWORD(value);
+  return id != 0;
+}
+
+bool ReadLocaleText(LANGID id, LCTYPE type, std::wstring& text) {
+  wchar_t buffer[kLocaleNameChars];
+  if (GetLocaleInfoW(id, type, buffer, kLocaleNameChars) <= 0) return false;
+  text = buffer;
+  return true;
+}
+
 BOOL MatchByIdentifier(LANGID id) {
   // Any supported locale of the same primary language makes the target usable.
-  if ((id & 0x3FF) != s.enumLangId) return TRUE;
+  if (PRIMARYLANGID(id) != s.enumLangId) return TRUE;
   s.enumFound = true;
   return FALSE;
 }
 
 BOOL MatchByName(LANGID id) {
   if (!s.enumName) return FALSE;
-  wchar_t langName[kLocaleNameChars];
-  if (GetLocaleInfoW(id, LOCALE_SISO639LANGNAME, langName, kLocaleNameChars) <= 0) return TRUE;
-  if (lstrcmpiW(langName, s.enumName) == 0) {
-    // A bare language folder names the primary language only.
-    s.enumFound = true;
-    s.enumLangId = id & 0x3FF;
-    s.enumCountryId = 0;
-    return FALSE;
-  }
-  wchar_t countryName[kLocaleNameChars];
-  if (GetLocaleInfoW(id, LOCALE_SISO3166CTRYNAME, countryName, kLocaleNameChars) <= 0) return TRUE;
-  wchar_t fullName[2 * kLocaleNameChars];
-  StringCchPrintfW(fullName, 2 * kLocaleNameChars, L"%s-%s", langName, countryName);
-  if (lstrcmpiW(fullName, s.enumName) != 0) return TRUE;
+  LocaleIsoNames names;
+  LANGID named = 0;
+  if (!ReadLocaleIsoNames(id, names) || !MatchFolderName(s.enumName, names, named)) return TRUE;
   s.enumFound = true;
-  s.enumLangId = id & 0x3FF;
-  s.enumCountryId = id >> 10;
+  s.enumLangId = PRIMARYLANGID(named);
+  s.enumCountryId = SUBLANGID(named);
   return FALSE;
 }
 
@@ -49,20 +53,29 @@ void Enumerate(unsigned short langId, unsigned short countryId, const wchar_t* n
   s.enumName = nullptr;  // the caller's text does not outlive the call
 }
 
+// The catalog being filled by FromSystem; the enumeration's callback takes no context.
+std::vector<LocaleIsoNames>* g_catalogBeingRead = nullptr;
+
+BOOL CALLBACK AddToCatalog(LPWSTR localeString) {
+  LANGID id = 0;
+  if (!ParseLocaleString(localeString, id)) return FALSE;
+  LocaleIsoNames names;
+  if (ReadLocaleIsoNames(id, names)) g_catalogBeingRead->push_back(std::move(names));
+  return TRUE;
+}
+
 }  // namespace
 
 BOOL CALLBACK EnumLocalesProc(LPWSTR localeString) {
-  unsigned int value = 0;
-  if (!localeString || swscanf(localeString, L"%x", &value) != 1) return FALSE;
-  LANGID id = LOWORD(value);
-  if (id == 0) return FALSE;
+  LANGID id = 0;
+  if (!ParseLocaleString(localeString, id)) return FALSE;
   return s.enumLangId != 0 ? MatchByIdentifier(id) : MatchByName(id);
 }
 
 bool IsValidLangID(unsigned short langId) {
   if (langId == 0) return false;
   // A primary language of 0 selects name mode with no name, which never matches.
-  Enumerate(langId & 0x3FF, langId >> 10, nullptr);
+  Enumerate(PRIMARYLANGID(langId), SUBLANGID(langId), nullptr);
   return s.enumFound;
 }
 
@@ -70,8 +83,49 @@ bool GetLangIDFromName(const wchar_t* name, unsigned short& langId) {
   langId = 0;
   if (!name) return false;
   Enumerate(0, 0, name);
-  if (s.enumFound) langId = static_cast<unsigned short>((s.enumCountryId << 10) | s.enumLangId);
+  if (s.enumFound) langId = MAKELANGID(s.enumLangId, s.enumCountryId);
   return s.enumFound;
+}
+
+bool ReadLocaleIsoNames(LANGID langId, LocaleIsoNames& names) {
+  names = LocaleIsoNames();
+  names.langId = langId;
+  if (!ReadLocaleText(langId, LOCALE_SISO639LANGNAME, names.language)) return false;
+  std::wstring country;
+  if (ReadLocaleText(langId, LOCALE_SISO3166CTRYNAME, country))
+    names.languageAndCountry = names.language + L"-" + country;
+  return true;
+}
+
+bool MatchFolderName(const wchar_t* folderName, const LocaleIsoNames& locale, LANGID& langId) {
+  if (lstrcmpiW(locale.language.c_str(), folderName) == 0) {
+    langId = MAKELANGID(PRIMARYLANGID(locale.langId), SUBLANG_NEUTRAL);
+    return true;
+  }
+  if (locale.languageAndCountry.empty() || lstrcmpiW(locale.languageAndCountry.c_str(), folderName) != 0) return false;
+  langId = locale.langId;
+  return true;
+}
+
+LocaleNameCatalog LocaleNameCatalog::FromSystem() {
+  std::vector<LocaleIsoNames> locales;
+  g_catalogBeingRead = &locales;
+  EnumSystemLocalesW(AddToCatalog, LCID_SUPPORTED);
+  g_catalogBeingRead = nullptr;
+  return LocaleNameCatalog(std::move(locales));
+}
+
+bool LocaleNameCatalog::LangIdFromName(const wchar_t* name, unsigned short& langId) const {
+  langId = 0;
+  if (!name) return false;
+  for (const LocaleIsoNames& locale : m_locales) {
+    LANGID named = 0;
+    if (MatchFolderName(name, locale, named)) {
+      langId = named;
+      return true;
+    }
+  }
+  return false;
 }
 
 }  // namespace KVELLocale

@@ -11,6 +11,7 @@
 
 #include <windows.h>
 
+#include "framework/Controls.h"
 #include "framework/Dialog.h"
 #include "settings/SettingsRegistry.h"
 
@@ -24,12 +25,10 @@ class CClientMaporaAdvancedConfigDlg : public CDialog {
   static CString LearnMoreAddress();
 
   AdminSession* m_pMainDlg = nullptr;  // set by the creator before the dialog is shown
-  DWORD m_selectedLangId = 0;             // item data of the selected language entry
-  DWORD m_enableKuei = 0;                 // raw EnableKUEI until the box is clicked, then 0 or 1
-  DWORD m_supportLocalPortal = 0;         // 0 or 1
-  bool m_languagesListed = false;
-  bool m_languagePackFound = false;  // a pack matches the Windows UI language
-  CString m_uiLocaleName;            // "en-US", or "en" once a language-only pack was seen
+  DWORD m_selectedLangId = 0;          // item data of the selected language entry
+  DWORD m_enableKuei = 0;              // raw EnableKUEI until the box is clicked, then 0 or 1
+  DWORD m_supportLocalPortal = 0;      // 0 or 1
+  bool m_languagePackFound = false;    // a pack serves the Windows UI language
 
  protected:
   void DoDataExchange(CDataExchange* pDX) override;
@@ -38,12 +37,7 @@ class CClientMaporaAdvancedConfigDlg : public CDialog {
 
  private:
   void BuildLanguageList();
-  void CollectLanguagePacks();
-  void ScanLanguagePackFolder(const CString& pattern);
-  void AddLanguageEntry(DWORD langId);
-  void SelectCurrentLanguage();
   void UpdateLanguageWarning();
-  int AppendLanguage(const CString& text, DWORD langId);
 
   LRESULT OnLanguageSelChange(WPARAM wParam, LPARAM lParam);
   LRESULT OnKueiClicked(WPARAM wParam, LPARAM lParam);
@@ -52,5 +46,5 @@ class CClientMaporaAdvancedConfigDlg : public CDialog {
   LRESULT OnManagePortals(WPARAM wParam, LPARAM lParam);
   LRESULT OnCtlColorWarning(WPARAM wParam, LPARAM lParam);
 
-  CWnd m_languageList;
+  CComboBox m_languageList;
 };

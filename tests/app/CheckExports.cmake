@@ -1,11 +1,19 @@
-# cmake -DEXE=<program> -DHEADER=<KVELLocale.h> -DOBJDUMP=<objdump> -P CheckExports.cmake
-# Fails unless the program is a GUI program whose export table carries every operation that the
-# header declares (each overload counted).
+# cmake -DEXE=<program> -DHEADER=<KVELLocale.h> -DOBJDUMP=<objdump> [-DFORMAT=<file format>] -P CheckExports.cmake
+# Fails unless the program exists, is a GUI program (of FORMAT, as objdump names it: pei-i386 for
+# 32-bit) and its export table carries every operation that the header declares (each overload
+# counted).
+if(NOT EXISTS "${EXE}")
+  message(FATAL_ERROR "${EXE} does not exist: build it first (the shipped 32-bit console: "
+                      "cmake --preset x86 && cmake --build --preset x86)")
+endif()
 string(REGEX REPLACE "objdump$" "c++filt" CXXFILT "${OBJDUMP}")
 execute_process(COMMAND ${OBJDUMP} -p ${EXE} COMMAND ${CXXFILT} -n
                 OUTPUT_VARIABLE dump RESULT_VARIABLE failed)
 if(failed)
   message(FATAL_ERROR "cannot read ${EXE} with ${OBJDUMP} and ${CXXFILT}")
+endif()
+if(FORMAT AND NOT dump MATCHES "file format ${FORMAT}")
+  message(FATAL_ERROR "${EXE} is not of file format ${FORMAT}")
 endif()
 if(NOT dump MATCHES "Subsystem[ \t]+00000002")
   message(FATAL_ERROR "${EXE} is not a Windows GUI program")

@@ -48,7 +48,7 @@ TEST_P(BrokenPack, ConsoleOpensEveryWindow) {
   ASSERT_TRUE(CopyFileTo(ConsolePath(), shared.Path() + L"\\MaporaAdmin.exe"));
   Process console(L"/Lang 1036", shared.Path() + L"\\MaporaAdmin.exe", {L"KVEL_DESKTOP10.5_INSTALLED=1"});
 
-  HWND main = console.WaitForWindow();
+  HWND main = console.WaitForMainWindow();
   ASSERT_NE(main, nullptr);
   EXPECT_EQ(Text(main), c.mainTitle);
   HWND page = FindWindowExW(main, nullptr, L"#32770", nullptr);

@@ -46,7 +46,7 @@ TEST_P(PlantedLibrary, NeverRuns) {
   Process console(L"", program.Path() + L"\\MaporaAdmin.exe");
   SetCurrentDirectoryW(previous);
 
-  HWND main = console.WaitForWindow();
+  HWND main = console.WaitForMainWindow();
   ASSERT_NE(main, nullptr);
   // The report is a rich edit control: the system's rich edit library was loaded after all.
   EXPECT_NE(GetDlgItem(FindWindowExW(main, nullptr, L"#32770", nullptr), IDC_REPORT), nullptr);

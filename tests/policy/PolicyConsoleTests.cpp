@@ -123,16 +123,16 @@ class PolicyWorkstation {
 struct OpenConsole {
   explicit OpenConsole(const PolicyWorkstation& workstation)
       : process(L"", workstation.Console(), {L"KVEL_DESKTOP10.5_INSTALLED=1"}) {
-    main = process.WaitForWindow();
+    main = process.WaitForMainWindow();
     if (!main || !WaitUntil([&] { return IsWindowVisible(Control(main, IDC_ADVANCED)) != FALSE; })) return;
     title = Text(main);
     Click(main, IDC_ADVANCED);
-    Search search{[&](HWND w) { return process.Shows(w) && GetDlgItem(w, IDC_LANGUAGE_LIST); }, nullptr};
+    WindowSearch search{[&](HWND w) { return process.Shows(w) && GetDlgItem(w, IDC_LANGUAGE_LIST); }};
     WaitUntil([&] {
-      EnumWindows(Match, reinterpret_cast<LPARAM>(&search));
-      return search.second != nullptr || !process.Running();
+      EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search));
+      return search.found != nullptr || !process.Running();
     });
-    dialog = search.second;
+    dialog = search.found;
   }
   Process process;
   HWND main = nullptr, dialog = nullptr;

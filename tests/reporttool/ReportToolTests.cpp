@@ -124,7 +124,7 @@ TEST_P(ReportText, IsTheConsolePage) {
   std::wstring shown;
   {
     Process console(L"", ConsolePath(), environment);
-    HWND main = console.WaitForWindow();
+    HWND main = console.WaitForMainWindow();
     ASSERT_NE(main, nullptr);
     shown = Text(Control(FindWindowExW(main, nullptr, L"#32770", nullptr), IDC_REPORT));
   }

@@ -1,0 +1,51 @@
+// The system's supported locales by their ISO names, for recognising many language-pack folder
+// names at once. GetLangIDFromName walks the system's locales afresh for every name; a list of
+// hundreds of folders reads them once into a catalog and resolves every name against that, with
+// the same rule. Not exported: the suite's own code uses it.
+#pragma once
+
+#include <windows.h>
+
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace KVELLocale {
+
+// The ISO names one supported locale goes by.
+struct LocaleIsoNames {
+  LANGID langId = 0;
+  std::wstring language;  // ISO 639: "pt"
+  // ISO 639 + "-" + ISO 3166: "pt-BR"; empty when the system cannot give the country.
+  std::wstring languageAndCountry;
+};
+
+// The ISO names of langId; false when even its language name cannot be had (no folder name can
+// name such a locale).
+bool ReadLocaleIsoNames(LANGID langId, LocaleIsoNames& names);
+
+// Whether a language-pack folder name names this locale, and the LANGID it stands for then. The
+// language name alone names the locale's primary language with no sub-language ("fr" gives
+// 0x000C, also when matched against fr-CA); language + "-" + country names the whole LANGID
+// ("fr-CA" gives 0x0C0C). Letter case is ignored. langId is left alone when the name does not match.
+bool MatchFolderName(const wchar_t* folderName, const LocaleIsoNames& locale, LANGID& langId);
+
+class LocaleNameCatalog {
+ public:
+  explicit LocaleNameCatalog(std::vector<LocaleIsoNames> locales) : m_locales(std::move(locales)) {}
+
+  // The supported locales (EnumSystemLocalesW, LCID_SUPPORTED) in the system's order, up to the
+  // first entry that is no locale identifier, as the by-name enumeration sees them.
+  static LocaleNameCatalog FromSystem();
+
+  // As GetLangIDFromName: the first locale in the catalog's order that the name names wins.
+  // langId is 0 unless one does.
+  bool LangIdFromName(const wchar_t* name, unsigned short& langId) const;
+
+  const std::vector<LocaleIsoNames>& Locales() const { return m_locales; }
+
+ private:
+  std::vector<LocaleIsoNames> m_locales;
+};
+
+}  // namespace KVELLocale
