@@ -4,6 +4,7 @@
 
 #include "app/ClientAdminDlg.h"
 #include "app/CommandLine.h"
+#include "framework/StartupTrace.h"
 #include "locale/KVELLocale.h"
 #include "res/resource.h"
 
@@ -26,26 +27,34 @@ void InitCommonControlClasses() {
 CClientAdminApp::~CClientAdminApp() = default;
 
 BOOL CClientAdminApp::InitInstance() {
+  fw::TraceStartup("process entry, command line");
   CMDACommandLineInfo commandLine;
   ParseCommandLine(commandLine);
 
+  fw::TraceStartup("locale override");
   if (!commandLine.m_strLang.empty()) KVELLocale::SetupEXEOverRide(LangIdFromText(commandLine.m_strLang));
 
   // From here on every string, template and image comes from the localized library, if any.
+  fw::TraceStartup("resource library");
   HINSTANCE localized = KVELLocale::LoadLocalizedRes(m_hInstance);
   if (localized != nullptr) fw::SetResourceHandle(localized);
 
+  fw::TraceStartup("OLE");
   EnableControlContainer();
   if (!InitOle()) {
     AfxMessageBox(IDS_OLE_INIT_FAILED, MB_OK);
     return FALSE;
   }
   SetMessagePendingDelay(kMessagePendingDelayMs);
+  fw::TraceStartup("rich edit library");
   InitRichEdit();
+  fw::TraceStartup("common controls");
   InitCommonControlClasses();
 
   {
+    fw::TraceStartup("main window constructor (icon, GDI+)");
     CClientAdminDlg mainDlg;
+    fw::TraceStartup("main window created from its template");
     m_pMainWnd = &mainDlg;
     mainDlg.DoModal();
     m_pMainWnd = nullptr;

@@ -10,6 +10,7 @@
 
 #include "app/ClientAdminDlg.h"
 #include "framework/ComRef.h"
+#include "framework/StartupTrace.h"
 #include "res/resource.h"
 #include "settings/AdvancedSettings.h"
 
@@ -175,6 +176,7 @@ void CClientMaporaConfigDlg::DoDataExchange(CDataExchange* pDX) {
 }
 
 BOOL CClientMaporaConfigDlg::OnInitDialog() {
+  fw::TraceStartup("page tree: root page advanced button");
   CDialog::OnInitDialog();
   UpdateAdvancedButton();
   return TRUE;
@@ -189,15 +191,19 @@ const MessageMap* CClientMaporaConfigDlg::GetMessageMap() const {
 }
 
 LRESULT CClientMaporaConfigDlg::OnAdvanced(WPARAM, LPARAM) {
+  fw::TraceStartup("advanced: clicked, link class, dialog created");
   if (m_pAdminDlg != nullptr) PersistAdvancedSettings(*m_pAdminDlg);
   return 0;
 }
 
 void CClientMaporaConfigDlg::BuildInstallationReport() {
+  fw::TraceStartup("report: composed from the registry");
   const ReportHeadings headings = LoadReportHeadings();
   const CString report =
       m_pAdminDlg != nullptr ? ComposeReport(m_pAdminDlg->m_installedProducts, headings) : CString();
+  fw::TraceStartup("report: text set");
   m_richEdit.SendMessage(WM_SETTEXT, 0, reinterpret_cast<LPARAM>(report.c_str()));
+  fw::TraceStartup("report: headings emphasised");
 
   // Only the first occurrence of a product heading is its heading; section headings repeat
   // once per block.
@@ -208,6 +214,7 @@ void CClientMaporaConfigDlg::BuildInstallationReport() {
   emphasis.Every(headings.servicePackInformation);
 
   m_richEdit.SendMessage(EM_SETSEL, 0, 0);
+  fw::TraceStartup("report built");
 }
 
 void CClientMaporaConfigDlg::UpdateAdvancedButton() {

@@ -6,6 +6,7 @@
 #include <iterator>
 
 #include "app/ClientAdminDlg.h"
+#include "framework/StartupTrace.h"
 #include "inventory/InstalledProducts.h"
 #include "locale/LocaleInternals.h"
 #include "res/resource.h"
@@ -73,6 +74,7 @@ const MessageMap* CClientMaporaAdvancedConfigDlg::GetMessageMap() const {
 }
 
 BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
+  fw::TraceStartup("advanced: OnInitDialog");
   CDialog::OnInitDialog();
   // Everything here reads the main window's state; without it there is nothing to show.
   if (m_pMainDlg == nullptr) {
@@ -80,6 +82,7 @@ BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
     return TRUE;
   }
   BuildLanguageList();
+  fw::TraceStartup("advanced: token manager, settings read");
 
   // The suite's token manager lives until initialisation is over, as the suite expects.
   CURLTokenManager tokens;
@@ -96,10 +99,12 @@ BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
   CheckDlgButton(m_hWnd, IDC_KUEI_CHECK, m_enableKuei != 0 ? BST_CHECKED : BST_UNCHECKED);
   m_supportLocalPortal = ReadSupportLocalPortal();
   CheckDlgButton(m_hWnd, IDC_LOCAL_PORTAL, m_supportLocalPortal != 0 ? BST_CHECKED : BST_UNCHECKED);
+  fw::TraceStartup("advanced: OnInitDialog done, shown");
   return TRUE;
 }
 
 void CClientMaporaAdvancedConfigDlg::BuildLanguageList() {
+  fw::TraceStartup("advanced: language list, Windows language entry");
   m_languagesListed = false;
   m_languageList.SendMessage(CB_RESETCONTENT);
   m_selectedLangId = m_pMainDlg->m_dwUILangID;
@@ -134,10 +139,12 @@ void CClientMaporaAdvancedConfigDlg::BuildLanguageList() {
       CString country;
       if (GetLocaleText(uiLang, LOCALE_SISO3166CTRYNAME, country)) m_uiLocaleName += L"-" + country;
     }
+    fw::TraceStartup("advanced: language pack scans");
     CollectLanguagePacks();
     m_languagesListed = true;
   }
 
+  fw::TraceStartup("advanced: current language selected");
   SelectCurrentLanguage();
   UpdateLanguageWarning();
 }
@@ -164,7 +171,9 @@ void CClientMaporaAdvancedConfigDlg::ScanLanguagePackFolder(const CString& patte
   do {
     if ((entry.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY) == 0) continue;
     unsigned short langId = 0;
+    fw::TraceStartup("advanced: pack folder, locale enumeration");
     if (!KVELLocale::GetLangIDFromName(entry.cFileName, langId)) continue;
+    fw::TraceStartup("advanced: pack folder, list entry");
     const CString folder = entry.cFileName;
     if (folder.find(L'-') == CString::npos) {
       // A language-only pack serves every country of its language.
