@@ -4,11 +4,13 @@
 // working sets, then times the opening of Advanced Configuration, and prints medians, minimums,
 // ratios and one summary line beginning with "BENCH ".
 //
-//   BenchDriver --console PATH --floor PATH [--runs N] [--trace FOLDER] [--close]
+//   BenchDriver --console PATH --floor PATH [--baseline PATH] [--runs N] [--trace FOLDER] [--close]
 //
-// --trace FOLDER has every started program write its start-up trace (MAPORA_STARTUP_TRACE) into
-// FOLDER and prints, per traced step, the median time it took. --close ends each program through
-// its Cancel button instead of terminating it and times that too.
+// --baseline PATH is another build of the console, timed in turn with the first in every phase,
+// so that a change is measured against the program before it under the same load. --trace FOLDER
+// has every started program write its start-up trace (MAPORA_STARTUP_TRACE) into FOLDER and
+// prints, per traced step, the median time it took. --close ends each program through its Cancel
+// button instead of terminating it and times that too.
 #include <windows.h>
 #include <psapi.h>
 
@@ -221,17 +223,10 @@ class TraceTable {
 struct Options {
   std::wstring console;
   std::wstring floor;
+  std::wstring baseline;
   std::wstring traceFolder;
   int runs = kDefaultRuns;
   bool close = false;
-};
-
-struct RunResult {
-  bool ok = false;
-  double startupMs = 0.0;
-  double advancedMs = 0.0;
-  double closeMs = 0.0;
-  double peakWorkingSetMb = 0.0;
 };
 
 class Run {
@@ -331,57 +326,70 @@ class Run {
   HWND m_mainWindow = nullptr;
 };
 
-std::wstring TraceFile(const Options& options, const wchar_t* kind, int index) {
+// One program under test and what was measured of it.
+struct Subject {
+  const char* name;     // in the output
+  const wchar_t* kind;  // in the names of its trace files
+  std::wstring path;
+  bool isConsole;  // it has "Advanced..."
+  std::vector<double> startupMs;
+  std::vector<double> peakWorkingSetMb;
+  std::vector<double> closeMs;
+  std::vector<double> advancedMs;
+  TraceTable startupSteps;
+  TraceTable advancedSteps;
+  TraceTable closeSteps;
+};
+
+std::wstring TraceFile(const Options& options, const wchar_t* kind, const wchar_t* phase, int index) {
   if (options.traceFolder.empty()) return std::wstring();
-  return options.traceFolder + L"\\" + kind + L"-" + std::to_wstring(index) + L".txt";
+  return options.traceFolder + L"\\" + kind + L"-" + phase + L"-" + std::to_wstring(index) + L".txt";
 }
 
 // One start of a program, timed to its ready main window; with advanced, also the opening of
-// Advanced Configuration. A traced run is added to the tables.
-RunResult TimeStart(const Options& options, const std::wstring& program, const wchar_t* kind, int index,
-                    bool advanced, TraceTable* startupTable, TraceTable* advancedTable, TraceTable* closeTable) {
-  RunResult result;
-  const std::wstring traceFile = TraceFile(options, kind, index);
-  double ready = 0.0;
+// Advanced Configuration. Adds what it measured to the subject unless it is a warm-up.
+bool TimeStart(const Options& options, Subject& subject, int index, bool advanced, bool warmUp) {
+  const wchar_t* phase = advanced ? L"advanced" : L"startup";
+  const std::wstring traceFile = warmUp ? std::wstring() : TraceFile(options, subject.kind, phase, index);
+  // With Advanced Configuration open the main window cannot close; such a run is terminated.
+  const bool close = options.close && !advanced;
+  Run run(subject.path, traceFile);
+  if (!run.Started()) return false;
+  const double ready = run.WaitForMainWindow();
+  if (ready < 0.0) {
+    std::fprintf(stderr, "%ls: no ready main window within %lu ms\n", subject.path.c_str(), kReadyTimeoutMs);
+    return false;
+  }
   double clicked = 0.0;
   double advancedReady = 0.0;
-  double closeStart = 0.0;
-  double settled = 0.0;
-  {
-    Run run(program, traceFile);
-    if (!run.Started()) return result;
-    ready = run.WaitForMainWindow();
-    if (ready < 0.0) {
-      std::fprintf(stderr, "%ls: no ready main window within %lu ms\n", program.c_str(), kReadyTimeoutMs);
-      return result;
-    }
-    result.startupMs = (ready - run.Start()) / 1000.0;
-    if (advanced && !run.OpenAdvanced(clicked, advancedReady)) return result;
-    result.advancedMs = (advancedReady - clicked) / 1000.0;
-    run.Settle();
-    settled = NowMicroseconds();
-    result.peakWorkingSetMb = run.PeakWorkingSetMb();
-    // With Advanced Configuration open the main window cannot close; that run is terminated.
-    if (options.close && !advanced) {
-      closeStart = NowMicroseconds();
-      result.closeMs = run.Close();
-      if (result.closeMs < 0.0) {
-        std::fprintf(stderr, "%ls did not end within %lu ms of Cancel\n", program.c_str(), kExitTimeoutMs);
-        return result;
-      }
-    }
-    result.ok = true;
-    if (!traceFile.empty()) {
-      const std::vector<Mark> marks = ReadTrace(traceFile);
-      if (startupTable != nullptr) startupTable->AddRun(marks, run.Start(), ready, settled);
-      if (advanced && advancedTable != nullptr) advancedTable->AddRun(marks, clicked, advancedReady, settled);
-      if (options.close && !advanced && closeTable != nullptr) {
-        const double ended = closeStart + result.closeMs * 1000.0;
-        closeTable->AddRun(marks, closeStart, ended, ended);
-      }
+  if (advanced && !run.OpenAdvanced(clicked, advancedReady)) return false;
+  run.Settle();
+  const double settled = NowMicroseconds();
+  const double peakWorkingSetMb = run.PeakWorkingSetMb();
+  double closeMs = 0.0;
+  if (close) {
+    closeMs = run.Close();
+    if (closeMs < 0.0) {
+      std::fprintf(stderr, "%ls did not end within %lu ms of Cancel\n", subject.path.c_str(), kExitTimeoutMs);
+      return false;
     }
   }
-  return result;
+  if (warmUp) return true;
+
+  const std::vector<Mark> marks = traceFile.empty() ? std::vector<Mark>() : ReadTrace(traceFile);
+  if (advanced) {
+    subject.advancedMs.push_back((advancedReady - clicked) / 1000.0);
+    subject.advancedSteps.AddRun(marks, clicked, advancedReady, settled);
+    return true;
+  }
+  subject.startupMs.push_back((ready - run.Start()) / 1000.0);
+  subject.peakWorkingSetMb.push_back(peakWorkingSetMb);
+  subject.startupSteps.AddRun(marks, run.Start(), ready, settled);
+  if (close) {
+    subject.closeMs.push_back(closeMs);
+    subject.closeSteps.AddRun(marks, settled, settled + closeMs * 1000.0, settled + closeMs * 1000.0);
+  }
+  return true;
 }
 
 bool ParseOptions(int argc, wchar_t** argv, Options& options) {
@@ -392,6 +400,8 @@ bool ParseOptions(int argc, wchar_t** argv, Options& options) {
       options.console = argv[++i];
     } else if (name == L"--floor" && hasValue) {
       options.floor = argv[++i];
+    } else if (name == L"--baseline" && hasValue) {
+      options.baseline = argv[++i];
     } else if (name == L"--trace" && hasValue) {
       options.traceFolder = argv[++i];
     } else if (name == L"--runs" && hasValue) {
@@ -405,8 +415,13 @@ bool ParseOptions(int argc, wchar_t** argv, Options& options) {
   return !options.console.empty() && !options.floor.empty() && options.runs > 0;
 }
 
-void PrintTimes(const char* name, const std::vector<double>& times) {
-  std::printf("  %-22s median %8.1f ms   min %8.1f ms\n", name, Median(times), Minimum(times));
+void PrintTimes(const Subject& subject, const std::vector<double>& times) {
+  std::printf("  %-22s median %8.1f ms   min %8.1f ms\n", subject.name, Median(times), Minimum(times));
+}
+
+void PrintRatio(const char* name, const std::vector<double>& times, const std::vector<double>& base) {
+  std::printf("  %-22s median %8.2f      min %8.2f\n", name, Ratio(Median(times), Median(base)),
+              Ratio(Minimum(times), Minimum(base)));
 }
 
 }  // namespace
@@ -414,77 +429,86 @@ void PrintTimes(const char* name, const std::vector<double>& times) {
 int wmain(int argc, wchar_t** argv) {
   Options options;
   if (!ParseOptions(argc, argv, options)) {
-    std::fprintf(stderr, "usage: BenchDriver --console PATH --floor PATH [--runs N] [--trace FOLDER] [--close]\n");
+    std::fprintf(stderr,
+                 "usage: BenchDriver --console PATH --floor PATH [--baseline PATH] [--runs N] [--trace FOLDER] "
+                 "[--close]\n");
     return 2;
   }
   if (!options.traceFolder.empty()) CreateDirectoryW(options.traceFolder.c_str(), nullptr);
   std::setvbuf(stdout, nullptr, _IONBF, 0);
 
-  std::printf("warming up (%d runs of each program)\n", kWarmUpRuns);
-  Options warmUp = options;
-  warmUp.traceFolder.clear();
-  for (int i = 0; i < kWarmUpRuns; ++i) {
-    if (!TimeStart(warmUp, options.console, L"console", i, true, nullptr, nullptr, nullptr).ok) return 1;
-    if (!TimeStart(warmUp, options.floor, L"floor", i, false, nullptr, nullptr, nullptr).ok) return 1;
-  }
+  std::vector<Subject> subjects;
+  subjects.push_back({"console", L"console", options.console, true, {}, {}, {}, {}, {}, {}, {}});
+  subjects.push_back({"floor", L"floor", options.floor, false, {}, {}, {}, {}, {}, {}, {}});
+  if (!options.baseline.empty())
+    subjects.push_back({"baseline console", L"baseline", options.baseline, true, {}, {}, {}, {}, {}, {}, {}});
+  Subject& console = subjects[0];
+  Subject& floor = subjects[1];
+  Subject* baseline = options.baseline.empty() ? nullptr : &subjects[2];
+  const size_t count = subjects.size();
 
-  std::printf("start-up: %d runs of each program, alternating\n", options.runs);
-  std::vector<double> console, floor, consoleWs, floorWs, consoleClose, floorClose;
-  TraceTable consoleTable, floorTable, consoleCloseTable;
-  for (int i = 0; i < options.runs; ++i) {
-    // The order within a pair alternates too, so that neither program always follows the other.
-    for (int turn = 0; turn < 2; ++turn) {
-      const bool consoleTurn = (turn == 0) == (i % 2 == 0);
-      const RunResult result =
-          consoleTurn
-              ? TimeStart(options, options.console, L"console", i, false, &consoleTable, nullptr, &consoleCloseTable)
-              : TimeStart(options, options.floor, L"floor", i, false, &floorTable, nullptr, nullptr);
-      if (!result.ok) return 1;
-      (consoleTurn ? console : floor).push_back(result.startupMs);
-      (consoleTurn ? consoleWs : floorWs).push_back(result.peakWorkingSetMb);
-      (consoleTurn ? consoleClose : floorClose).push_back(result.closeMs);
+  std::printf("warming up (%d runs of each program)\n", kWarmUpRuns);
+  for (int i = 0; i < kWarmUpRuns; ++i) {
+    for (Subject& subject : subjects) {
+      if (!TimeStart(options, subject, i, subject.isConsole, true)) return 1;
     }
   }
 
-  std::printf("Advanced Configuration: %d openings, each in a fresh console\n", options.runs);
-  std::vector<double> advanced;
-  TraceTable advancedTable;
-  Options advancedOptions = options;
-  advancedOptions.close = false;
+  std::printf("start-up: %d runs of each program, taking turns\n", options.runs);
   for (int i = 0; i < options.runs; ++i) {
-    const RunResult result =
-        TimeStart(advancedOptions, options.console, L"advanced", i, true, nullptr, &advancedTable, nullptr);
-    if (!result.ok) return 1;
-    advanced.push_back(result.advancedMs);
+    // The order rotates too, so that no program always follows the same one.
+    for (size_t turn = 0; turn < count; ++turn) {
+      if (!TimeStart(options, subjects[(static_cast<size_t>(i) + turn) % count], i, false, false)) return 1;
+    }
+  }
+
+  std::printf("Advanced Configuration: %d openings, each in a freshly started console\n", options.runs);
+  for (int i = 0; i < options.runs; ++i) {
+    const bool baselineFirst = baseline != nullptr && i % 2 != 0;
+    if (baselineFirst && !TimeStart(options, *baseline, i, true, false)) return 1;
+    if (!TimeStart(options, console, i, true, false)) return 1;
+    if (baseline != nullptr && !baselineFirst && !TimeStart(options, *baseline, i, true, false)) return 1;
   }
 
   std::printf("\nprocess created -> main window visible with the report text filled\n");
-  PrintTimes("console", console);
-  PrintTimes("floor", floor);
-  std::printf("  %-22s median %8.2f      min %8.2f\n", "console / floor", Ratio(Median(console), Median(floor)),
-              Ratio(Minimum(console), Minimum(floor)));
+  for (const Subject& subject : subjects) PrintTimes(subject, subject.startupMs);
+  PrintRatio("console / floor", console.startupMs, floor.startupMs);
+  if (baseline != nullptr) PrintRatio("console / baseline", console.startupMs, baseline->startupMs);
   std::printf("peak working set\n");
-  std::printf("  %-22s median %8.1f MB\n", "console", Median(consoleWs));
-  std::printf("  %-22s median %8.1f MB\n", "floor", Median(floorWs));
-  std::printf("  %-22s median %8.2f\n", "console / floor", Ratio(Median(consoleWs), Median(floorWs)));
+  for (const Subject& subject : subjects)
+    std::printf("  %-22s median %8.1f MB\n", subject.name, Median(subject.peakWorkingSetMb));
+  std::printf("  %-22s median %8.2f\n", "console / floor",
+              Ratio(Median(console.peakWorkingSetMb), Median(floor.peakWorkingSetMb)));
   std::printf("click on \"Advanced...\" -> Advanced Configuration shown with its language list filled\n");
-  PrintTimes("console", advanced);
+  PrintTimes(console, console.advancedMs);
+  if (baseline != nullptr) {
+    PrintTimes(*baseline, baseline->advancedMs);
+    PrintRatio("console / baseline", console.advancedMs, baseline->advancedMs);
+  }
   if (options.close) {
     std::printf("Cancel -> process ended\n");
-    PrintTimes("console", consoleClose);
-    PrintTimes("floor", floorClose);
+    for (const Subject& subject : subjects) PrintTimes(subject, subject.closeMs);
   }
 
-  consoleTable.Print("Console start-up steps", "process creation", "the window was ready");
-  floorTable.Print("Floor start-up steps", "process creation", "the window was ready");
-  advancedTable.Print("Advanced Configuration steps", "the click", "the dialog was ready");
-  consoleCloseTable.Print("Console shutdown steps", "Cancel", "the process ended");
+  for (const Subject& subject : subjects) {
+    const std::string name = subject.name;
+    subject.startupSteps.Print((name + ": start-up steps").c_str(), "process creation", "the window was ready");
+    subject.advancedSteps.Print((name + ": Advanced Configuration steps").c_str(), "the click",
+                                "the dialog was ready");
+    subject.closeSteps.Print((name + ": shutdown steps").c_str(), "Cancel", "the process ended");
+  }
 
   std::printf("\nBENCH startup_ratio=%.2f console_ms=%.1f floor_ms=%.1f advanced_ms=%.1f ws_ratio=%.2f "
               "console_ws_mb=%.1f floor_ws_mb=%.1f",
-              Ratio(Median(console), Median(floor)), Median(console), Median(floor), Median(advanced),
-              Ratio(Median(consoleWs), Median(floorWs)), Median(consoleWs), Median(floorWs));
-  if (options.close) std::printf(" console_close_ms=%.1f floor_close_ms=%.1f", Median(consoleClose), Median(floorClose));
+              Ratio(Median(console.startupMs), Median(floor.startupMs)), Median(console.startupMs),
+              Median(floor.startupMs), Median(console.advancedMs),
+              Ratio(Median(console.peakWorkingSetMb), Median(floor.peakWorkingSetMb)),
+              Median(console.peakWorkingSetMb), Median(floor.peakWorkingSetMb));
+  if (options.close)
+    std::printf(" console_close_ms=%.1f floor_close_ms=%.1f", Median(console.closeMs), Median(floor.closeMs));
+  if (baseline != nullptr)
+    std::printf(" baseline_ms=%.1f baseline_advanced_ms=%.1f", Median(baseline->startupMs),
+                Median(baseline->advancedMs));
   std::printf(" runs=%d traced=%d\n", options.runs, options.traceFolder.empty() ? 0 : 1);
   return 0;
 }

@@ -4,12 +4,14 @@
 # Configuration, on a workstation like the sample one with many language-pack folders. Not a
 # test: nothing fails on a slow figure, and CI does not run it.
 #
-#   tools/bench.sh [--runs N] [--trace] [--close] [--folders N]
+#   tools/bench.sh [--runs N] [--trace] [--close] [--folders N] [--baseline EXE]
 #
-#   --runs N     measured starts of each program, and openings of Advanced Configuration (15)
-#   --trace      the programs write start-up traces (MAPORA_STARTUP_TRACE); prints where the time goes
-#   --close      ends each program through Cancel instead of terminating it, and times that
-#   --folders N  language-pack folders added to each product's bin folder (200, at most 200)
+#   --runs N        measured starts of each program, and openings of Advanced Configuration (15)
+#   --trace         the programs write start-up traces (MAPORA_STARTUP_TRACE); prints where the time goes
+#   --close         ends each program through Cancel instead of terminating it, and times that
+#   --folders N     language-pack folders added to each product's bin folder (200, at most 200)
+#   --baseline EXE  another x64 build of MaporaAdmin.exe, timed in turn with this one: a change
+#                   measured against the program before it, under the same load
 #
 # Everything runs in one warm wineserver on a private Xvfb display, in the prefix build/bench/prefix,
 # both of which it stops at the end. The last line of the output is "BENCH key=value ...".
@@ -19,6 +21,7 @@ root=$(pwd)
 
 runs=15
 folders=200
+baseline=
 driver_options=()
 while [ $# -gt 0 ]; do
   case "$1" in
@@ -26,7 +29,8 @@ while [ $# -gt 0 ]; do
     --folders) folders=${2:?--folders needs a number}; shift 2 ;;
     --trace) driver_options+=(--trace 'C:\bench\trace'); shift ;;
     --close) driver_options+=(--close); shift ;;
-    *) echo "usage: $0 [--runs N] [--trace] [--close] [--folders N]" >&2; exit 2 ;;
+    --baseline) baseline=$(realpath "${2:?--baseline needs a program}"); shift 2 ;;
+    *) echo "usage: $0 [--runs N] [--trace] [--close] [--folders N] [--baseline EXE]" >&2; exit 2 ;;
   esac
 done
 
@@ -80,6 +84,10 @@ echo "Language-pack folders added to each product's bin folder: $folders"
 console='C:\Program Files (x86)\Common Files\Mapora\bin\MaporaAdmin.exe'
 floor='C:\Program Files (x86)\Common Files\Mapora\bin\BenchDialog.exe'
 cp -f build/x64/bench/BenchDialog.exe "$drive_c/Program Files (x86)/Common Files/Mapora/bin/"
+if [ -n "$baseline" ]; then
+  cp -f "$baseline" "$drive_c/Program Files (x86)/Common Files/Mapora/bin/MaporaAdminBaseline.exe"
+  driver_options+=(--baseline 'C:\Program Files (x86)\Common Files\Mapora\bin\MaporaAdminBaseline.exe')
+fi
 mkdir -p "$drive_c/bench"
 cp -f build/x64/bench/BenchDriver.exe "$drive_c/bench/"
 rm -rf "$drive_c/bench/trace"
@@ -89,7 +97,7 @@ wineserver -k; wineserver -w
 wineserver -p </dev/null >/dev/null 2>&1
 wine cmd /c exit </dev/null >/dev/null 2>&1
 
-echo "Machine: $(nproc) cores, $(wine --version), $(date -u +%Y-%m-%d)"
+echo "Machine: $(nproc) cores, load average $(cut -d" " -f1-3 /proc/loadavg), $(wine --version), $(date -u +%Y-%m-%d)"
 # The programs run in English, as the tests do; the driver passes the setting on to them.
-LC_ALL=en_US.UTF-8 wine 'C:\bench\BenchDriver.exe' --console "$console" --floor "$floor" --runs "$runs" "${driver_options[@]}" \
-  </dev/null 2>&1 | tee "$bench/last-run.txt"
+LC_ALL=en_US.UTF-8 wine 'C:\bench\BenchDriver.exe' --console "$console" --floor "$floor" --runs "$runs" \
+  "${driver_options[@]}" </dev/null 2>&1 | tee "$bench/last-run.txt"
