@@ -13,6 +13,7 @@
 // button instead of terminating it and times that too.
 #include <windows.h>
 #include <psapi.h>
+#include <tlhelp32.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -300,6 +301,23 @@ class Run {
     return false;
   }
 
+  // The names of the libraries the process has loaded, in lower case and sorted.
+  std::vector<std::wstring> Libraries() const {
+    std::vector<std::wstring> names;
+    HANDLE snapshot = CreateToolhelp32Snapshot(TH32CS_SNAPMODULE, m_process.dwProcessId);
+    if (snapshot == INVALID_HANDLE_VALUE) return names;
+    MODULEENTRY32W module = {};
+    module.dwSize = sizeof module;
+    for (BOOL more = Module32FirstW(snapshot, &module); more; more = Module32NextW(snapshot, &module)) {
+      std::wstring name = module.szModule;
+      CharLowerBuffW(&name[0], static_cast<DWORD>(name.size()));
+      names.push_back(name);
+    }
+    CloseHandle(snapshot);
+    std::sort(names.begin(), names.end());
+    return names;
+  }
+
   double PeakWorkingSetMb() const {
     PROCESS_MEMORY_COUNTERS counters = {};
     counters.cb = sizeof counters;
@@ -328,10 +346,10 @@ class Run {
 
 // One program under test and what was measured of it.
 struct Subject {
-  const char* name;     // in the output
-  const wchar_t* kind;  // in the names of its trace files
+  const char* name = "";     // in the output
+  const wchar_t* kind = L"";  // in the names of its trace files
   std::wstring path;
-  bool isConsole;  // it has "Advanced..."
+  bool isConsole = false;  // it has "Advanced..."
   std::vector<double> startupMs;
   std::vector<double> peakWorkingSetMb;
   std::vector<double> closeMs;
@@ -339,7 +357,17 @@ struct Subject {
   TraceTable startupSteps;
   TraceTable advancedSteps;
   TraceTable closeSteps;
+  std::vector<std::wstring> libraries;  // loaded when the window was ready, in a traced run
 };
+
+Subject MakeSubject(const char* name, const wchar_t* kind, const std::wstring& path, bool isConsole) {
+  Subject subject;
+  subject.name = name;
+  subject.kind = kind;
+  subject.path = path;
+  subject.isConsole = isConsole;
+  return subject;
+}
 
 std::wstring TraceFile(const Options& options, const wchar_t* kind, const wchar_t* phase, int index) {
   if (options.traceFolder.empty()) return std::wstring();
@@ -366,6 +394,7 @@ bool TimeStart(const Options& options, Subject& subject, int index, bool advance
   run.Settle();
   const double settled = NowMicroseconds();
   const double peakWorkingSetMb = run.PeakWorkingSetMb();
+  if (!traceFile.empty() && !advanced && subject.libraries.empty()) subject.libraries = run.Libraries();
   double closeMs = 0.0;
   if (close) {
     closeMs = run.Close();
@@ -438,10 +467,10 @@ int wmain(int argc, wchar_t** argv) {
   std::setvbuf(stdout, nullptr, _IONBF, 0);
 
   std::vector<Subject> subjects;
-  subjects.push_back({"console", L"console", options.console, true, {}, {}, {}, {}, {}, {}, {}});
-  subjects.push_back({"floor", L"floor", options.floor, false, {}, {}, {}, {}, {}, {}, {}});
+  subjects.push_back(MakeSubject("console", L"console", options.console, true));
+  subjects.push_back(MakeSubject("floor", L"floor", options.floor, false));
   if (!options.baseline.empty())
-    subjects.push_back({"baseline console", L"baseline", options.baseline, true, {}, {}, {}, {}, {}, {}, {}});
+    subjects.push_back(MakeSubject("baseline console", L"baseline", options.baseline, true));
   Subject& console = subjects[0];
   Subject& floor = subjects[1];
   Subject* baseline = options.baseline.empty() ? nullptr : &subjects[2];
@@ -490,6 +519,14 @@ int wmain(int argc, wchar_t** argv) {
     for (const Subject& subject : subjects) PrintTimes(subject, subject.closeMs);
   }
 
+  if (!console.libraries.empty() && !floor.libraries.empty()) {
+    std::printf("\nlibraries the console has loaded and the floor has not:");
+    for (const std::wstring& library : console.libraries) {
+      if (!std::binary_search(floor.libraries.begin(), floor.libraries.end(), library))
+        std::printf(" %ls", library.c_str());
+    }
+    std::printf("\n");
+  }
   for (const Subject& subject : subjects) {
     const std::string name = subject.name;
     subject.startupSteps.Print((name + ": start-up steps").c_str(), "process creation", "the window was ready");
