@@ -325,9 +325,10 @@ class Run {
     return static_cast<double>(counters.PeakWorkingSetSize) / kBytesPerMegabyte;
   }
 
-  // Presses Cancel on the main window and waits for the process to end; milliseconds, or < 0.
-  double Close() {
-    const double pressed = NowMicroseconds();
+  // Presses Cancel on the main window and waits for the process to end; milliseconds from
+  // pressed, or < 0.
+  double Close(double& pressed) {
+    pressed = NowMicroseconds();
     PostMessageW(m_mainWindow, WM_COMMAND, MAKEWPARAM(IDCANCEL, BN_CLICKED), 0);
     if (WaitForSingleObject(m_process.hProcess, kExitTimeoutMs) != WAIT_OBJECT_0) return -1.0;
     return (NowMicroseconds() - pressed) / 1000.0;
@@ -396,8 +397,9 @@ bool TimeStart(const Options& options, Subject& subject, int index, bool advance
   const double peakWorkingSetMb = run.PeakWorkingSetMb();
   if (!traceFile.empty() && !advanced && subject.libraries.empty()) subject.libraries = run.Libraries();
   double closeMs = 0.0;
+  double closePressed = 0.0;
   if (close) {
-    closeMs = run.Close();
+    closeMs = run.Close(closePressed);
     if (closeMs < 0.0) {
       std::fprintf(stderr, "%ls did not end within %lu ms of Cancel\n", subject.path.c_str(), kExitTimeoutMs);
       return false;
@@ -416,7 +418,8 @@ bool TimeStart(const Options& options, Subject& subject, int index, bool advance
   subject.startupSteps.AddRun(marks, run.Start(), ready, settled);
   if (close) {
     subject.closeMs.push_back(closeMs);
-    subject.closeSteps.AddRun(marks, settled, settled + closeMs * 1000.0, settled + closeMs * 1000.0);
+    const double ended = closePressed + closeMs * 1000.0;
+    subject.closeSteps.AddRun(marks, closePressed, ended, ended);
   }
   return true;
 }
