@@ -36,6 +36,9 @@ constexpr DWORD kPollIntervalMs = 1;
 constexpr UINT kMessageTimeoutMs = 2000;
 // A traced run waits this long once the window is ready, so that the first paint is traced too.
 constexpr DWORD kTraceSettleMs = 400;
+// "Advanced..." is clicked this long after the main window is ready, as a person would: the
+// window has painted and whatever the console does after showing it is over.
+constexpr DWORD kClickDelayMs = 500;
 constexpr int kAdvancedButtonId = 3601;
 constexpr int kLanguageListId = 3563;
 // The list holds the Windows-language and English entries before any language pack is listed.
@@ -286,6 +289,7 @@ class Run {
       std::fprintf(stderr, "the console shows no visible \"Advanced...\" button\n");
       return false;
     }
+    Sleep(kClickDelayMs);
     clicked = NowMicroseconds();
     PostMessageW(GetParent(button), WM_COMMAND, MAKEWPARAM(kAdvancedButtonId, BN_CLICKED),
                  reinterpret_cast<LPARAM>(button));
