@@ -192,12 +192,13 @@ class TraceTable {
 
   void Print(const char* title, const char* startName, const char* endName) const {
     if (m_rows.empty()) return;
-    std::printf("\n%s (median over %zu runs; ms from %s)\n", title, m_toFirstMark.size(), startName);
-    std::printf("  %-52s %9s %9s %6s\n", "step (until the next mark)", "begins", "takes", "times");
-    std::printf("  %-52s %9.1f %9.1f %6d\n", "(before the first mark)", 0.0, Median(m_toFirstMark), 1);
+    std::printf("\n%s (median and fastest of %zu runs; ms from %s)\n", title, m_toFirstMark.size(), startName);
+    std::printf("  %-52s %9s %9s %9s %6s\n", "step (until the next mark)", "begins", "takes", "fastest", "times");
+    std::printf("  %-52s %9.1f %9.1f %9.1f %6d\n", "(before the first mark)", 0.0, Median(m_toFirstMark),
+                Minimum(m_toFirstMark), 1);
     for (const Row& row : m_rows) {
-      std::printf("  %-52.52s %9.1f %9.1f %6.0f\n", row.step.c_str(), Median(row.at), Median(row.took),
-                  Median(row.count));
+      std::printf("  %-52.52s %9.1f %9.1f %9.1f %6.0f\n", row.step.c_str(), Median(row.at), Median(row.took),
+                  Minimum(row.took), Median(row.count));
     }
     std::printf("  (a step that begins after %s takes no part in it)\n", endName);
   }
