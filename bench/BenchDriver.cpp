@@ -1,5 +1,5 @@
 // Driver of the start-up benchmark (tools/bench.sh runs it under the same wineserver as the
-// programs it starts). It starts the console and the floor program alternately and times each
+// programs it starts). It starts the console and the floor program in turn and times each
 // from "process created" to "main window visible with the report text filled", reads their peak
 // working sets, then times the opening of Advanced Configuration, and prints medians, minimums,
 // ratios and one summary line beginning with "BENCH ".
@@ -9,7 +9,7 @@
 // --baseline PATH is another build of the console, timed in turn with the first in every phase,
 // so that a change is measured against the program before it under the same load. --trace FOLDER
 // has every started program write its start-up trace (MAPORA_STARTUP_TRACE) into FOLDER and
-// prints, per traced step, the median time it took. --close ends each program through its Cancel
+// prints, per traced step, the median and the fastest time it took. --close ends each program through its Cancel
 // button instead of terminating it and times that too.
 #include <windows.h>
 #include <psapi.h>
@@ -20,7 +20,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
-#include <fstream>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -352,7 +351,7 @@ class Run {
 
 // One program under test and what was measured of it.
 struct Subject {
-  const char* name = "";     // in the output
+  const char* name = "";      // in the output
   const wchar_t* kind = L"";  // in the names of its trace files
   std::wstring path;
   bool isConsole = false;  // it has "Advanced..."
