@@ -33,6 +33,9 @@ while [ $# -gt 0 ]; do
     *) echo "usage: $0 [--runs N] [--trace] [--close] [--folders N] [--baseline EXE]" >&2; exit 2 ;;
   esac
 done
+[[ "$runs" =~ ^[1-9][0-9]*$ && "$folders" =~ ^[0-9]+$ ]] || { echo "--runs and --folders take a number" >&2; exit 2; }
+mapfile -t names < <(grep -v '^#' bench/language-folders.txt)
+[ "$folders" -le "${#names[@]}" ] || { echo "--folders: at most ${#names[@]}" >&2; exit 2; }
 
 tools/install-deps.sh
 cmake --preset x64 >/dev/null
@@ -65,8 +68,6 @@ workstation/workstation.sh provision build/x64
 
 # The language-pack folders of a big installation in Desktop's and Engine's bin folders: the first
 # $folders names of the list are there, the others are not (a run with fewer removes them).
-mapfile -t names < <(grep -v '^#' bench/language-folders.txt)
-[ "$folders" -le "${#names[@]}" ] || { echo "--folders: at most ${#names[@]}" >&2; exit 2; }
 for product in Desktop10.5 Engine10.5; do
   bin="$drive_c/Program Files (x86)/Kvel/$product/bin"
   for i in "${!names[@]}"; do
