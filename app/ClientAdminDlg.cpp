@@ -9,6 +9,7 @@
 #include "framework/App.h"
 #include "framework/PngResource.h"
 #include "framework/RegistryKey.h"
+#include "framework/StartupTrace.h"
 #include "inventory/ClientMaporaConfigDlg.h"
 #include "locale/KVELLocale.h"
 #include "res/resource.h"
@@ -63,6 +64,7 @@ const MessageMap* CClientAdminDlg::GetMessageMap() const {
 }
 
 BOOL CClientAdminDlg::OnInitDialog() {
+  fw::TraceStartup("OnInitDialog: system menu, icon");
   CDialog::OnInitDialog();
 
   CString aboutText = fw::LoadString(IDS_ABOUTBOX);
@@ -75,11 +77,15 @@ BOOL CClientAdminDlg::OnInitDialog() {
   SendMessage(WM_SETICON, ICON_BIG, reinterpret_cast<LPARAM>(m_hIcon));
   SendMessage(WM_SETICON, ICON_SMALL, reinterpret_cast<LPARAM>(m_hIcon));
 
+  fw::TraceStartup("OnInitDialog: tree images");
   LoadTreeImages();
   // Only the enumerator it keeps matters here: detection asks it which runtimes are present.
+  fw::TraceStartup("OnInitDialog: runtime list");
   ListInstalledRuntimeVersions(m_installedProducts);
   LoadSettings();
+  fw::TraceStartup("OnInitDialog: page tree");
   BuildPageTree();
+  fw::TraceStartup("OnInitDialog done: window shown");
   return TRUE;
 }
 
@@ -95,9 +101,12 @@ void CClientAdminDlg::LoadTreeImages() {
 }
 
 void CClientAdminDlg::LoadSettings() {
+  fw::TraceStartup("OnInitDialog: product detection");
   DetectInstalledProducts(m_installedProducts);
+  fw::TraceStartup("OnInitDialog: UILANGID");
   DWORD storedLanguage = ReadRegistryDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue, kNoStoredLanguage);
   if (storedLanguage != kNoStoredLanguage) m_dwUILangID = storedLanguage;
+  fw::TraceStartup("OnInitDialog: machine-settings probe");
   m_machineSettingsWritable = CanWriteMachineSettings();
 }
 
@@ -109,6 +118,7 @@ void CClientAdminDlg::BuildPageTree() {
 
   // The page places itself beside the tree: its template carries its position.
   rootPage.m_pAdminDlg = this;
+  fw::TraceStartup("page tree: root page created");
   rootPage.Create(IDD_MAPORA_CONFIG, this);
   m_bPagesCreated = true;
 
@@ -204,13 +214,16 @@ LRESULT CClientAdminDlg::OnApply(WPARAM, LPARAM) {
 }
 
 LRESULT CClientAdminDlg::OnDestroy(WPARAM, LPARAM) {
+  fw::TraceStartup("shutdown: help windows closed");
   KVELLocale::KVEL_HtmlHelp(nullptr, HH_CLOSE_ALL, 0);
+  fw::TraceStartup("shutdown: main window destroyed");
   if (AfxGetApp() != nullptr) AfxGetApp()->SetHelpFilePath(CString());
   Default();
   return 0;
 }
 
 LRESULT CClientAdminDlg::OnPaint(WPARAM, LPARAM) {
+  fw::TraceStartup("main window painted");
   if (!IsIconic(m_hWnd)) {
     Default();
     return 0;

@@ -6,6 +6,7 @@
 #include <iterator>
 
 #include "inventory/InstallationReport.h"
+#include "framework/StartupTrace.h"
 #include "res/resource.h"
 
 namespace {
@@ -67,6 +68,7 @@ void CClientMaporaConfigDlg::DoDataExchange(CDataExchange* pDX) {
 }
 
 BOOL CClientMaporaConfigDlg::OnInitDialog() {
+  fw::TraceStartup("page tree: root page advanced button");
   CDialog::OnInitDialog();
   UpdateAdvancedButton();
   return TRUE;
@@ -81,17 +83,22 @@ const MessageMap* CClientMaporaConfigDlg::GetMessageMap() const {
 }
 
 LRESULT CClientMaporaConfigDlg::OnAdvanced(WPARAM, LPARAM) {
+  fw::TraceStartup("advanced: clicked");
   if (m_pAdminDlg != nullptr) m_pAdminDlg->OpenAdvancedSettings();
   return 0;
 }
 
 void CClientMaporaConfigDlg::BuildInstallationReport() {
+  fw::TraceStartup("report: composed from the registry");
   InstallationReport report;
   if (m_pAdminDlg != nullptr)
     report = ComposeInstallationReport(ReadReportInput(m_pAdminDlg->m_installedProducts), LoadReportTexts());
+  fw::TraceStartup("report: text set");
   m_richEdit.SetWindowText(report.text);
+  fw::TraceStartup("report: headings emphasised");
   EmphasiseRanges(m_richEdit, report);
   m_richEdit.SendMessage(EM_SETSEL, 0, 0);
+  fw::TraceStartup("report built");
 }
 
 void CClientMaporaConfigDlg::UpdateAdvancedButton() {

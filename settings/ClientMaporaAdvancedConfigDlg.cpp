@@ -5,6 +5,7 @@
 #include <iterator>
 
 #include "inventory/AdminSession.h"
+#include "framework/StartupTrace.h"
 #include "inventory/InstalledProducts.h"
 #include "res/resource.h"
 #include "settings/AdvancedSettings.h"
@@ -49,6 +50,7 @@ const MessageMap* CClientMaporaAdvancedConfigDlg::GetMessageMap() const {
 }
 
 BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
+  fw::TraceStartup("advanced: OnInitDialog");
   CDialog::OnInitDialog();
   // Everything here reads the main window's state; without it there is nothing to show.
   if (m_pMainDlg == nullptr) {
@@ -56,6 +58,7 @@ BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
     return TRUE;
   }
   BuildLanguageList();
+  fw::TraceStartup("advanced: token manager, settings read");
 
   // The suite's token manager lives until initialisation is over, as the suite expects.
   CURLTokenManager tokens;
@@ -72,6 +75,7 @@ BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
   CheckItem(IDC_KUEI_CHECK, m_enableKuei != 0);
   m_supportLocalPortal = ReadSupportLocalPortal();
   CheckItem(IDC_LOCAL_PORTAL, m_supportLocalPortal != 0);
+  fw::TraceStartup("advanced: OnInitDialog done, shown");
   return TRUE;
 }
 
@@ -91,7 +95,9 @@ void CClientMaporaAdvancedConfigDlg::BuildLanguageList() {
     input.windowsEntryText = fw::LoadString(IDS_DISPLAY_LANGUAGE);
   }
   input.uiLocaleName = UILocaleName(uiLang);
+  fw::TraceStartup("advanced: language pack scans");
   input.products = FindLanguagePackFolders(m_pMainDlg->m_installedProducts);
+  fw::TraceStartup("advanced: language list built");
 
   const DisplayLanguageList list = BuildDisplayLanguageList(input);
   if (list.forgetStoredLanguage) {
