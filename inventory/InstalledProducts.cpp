@@ -185,8 +185,9 @@ std::wstring GetCoreProductVersion(const std::wstring& installDir) {
   // The separator is always added: Windows takes a doubled one when installDir ends with "\".
   const std::wstring path = installDir + L"\\bin\\pfcore.dll";
   // Bound here rather than imported: the loader would take an imported version.dll from beside
-  // the program before any of its code runs.
-  const fw::SystemLibrary versionLibrary(L"version.dll");
+  // the program before any of its code runs. Kept once loaded, as an import would be: every
+  // report reads three products.
+  static const fw::SystemLibrary versionLibrary(L"version.dll");
   auto getSize = versionLibrary.Find<decltype(&GetFileVersionInfoSizeW)>("GetFileVersionInfoSizeW");
   auto getInfo = versionLibrary.Find<decltype(&GetFileVersionInfoW)>("GetFileVersionInfoW");
   auto queryValue = versionLibrary.Find<decltype(&VerQueryValueW)>("VerQueryValueW");
