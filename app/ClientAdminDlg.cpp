@@ -74,8 +74,8 @@ BOOL CClientAdminDlg::OnInitDialog() {
     AppendMenuW(systemMenu, MF_STRING, IDM_ABOUTBOX, aboutText.c_str());
   }
   // The program icon in the caption and the task bar.
-  SendMessage(WM_SETICON, ICON_BIG, reinterpret_cast<LPARAM>(m_hIcon));
-  SendMessage(WM_SETICON, ICON_SMALL, reinterpret_cast<LPARAM>(m_hIcon));
+  SetIcon(m_hIcon, true);
+  SetIcon(m_hIcon, false);
 
   fw::TraceStartup("OnInitDialog: tree images");
   LoadTreeImages();

@@ -5,6 +5,7 @@
 
 #include <windows.h>
 #include <commctrl.h>
+#include <richedit.h>
 
 #include "framework/ScopedHandle.h"
 #include "framework/Wnd.h"
@@ -44,6 +45,17 @@ class CComboBox : public CWnd {
     RECT client = {};
     ::GetClientRect(m_hWnd, &client);
     ::SetWindowPos(m_hWnd, nullptr, 0, 0, client.right - client.left, pixels, SWP_NOMOVE | SWP_NOZORDER);
+  }
+};
+
+class CRichEditCtrl : public CWnd {
+ public:
+  // Selects [start, end) in the control's own character positions; (0, 0) puts the caret first.
+  void SetSel(size_t start, size_t end) const {
+    SendMessage(EM_SETSEL, static_cast<WPARAM>(start), static_cast<LPARAM>(end));
+  }
+  void SetSelectionCharFormat(const CHARFORMAT2W& format) const {
+    SendMessage(EM_SETCHARFORMAT, SCF_SELECTION, reinterpret_cast<LPARAM>(&format));
   }
 };
 

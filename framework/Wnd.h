@@ -21,6 +21,10 @@ class CWnd {
   void ShowWindow(int command) const { ::ShowWindow(m_hWnd, command); }
   void EnableWindow(bool enable) const { ::EnableWindow(m_hWnd, enable ? TRUE : FALSE); }
   void SetWindowText(const CString& text) const { ::SetWindowTextW(m_hWnd, text.c_str()); }
+  // The icon of the caption (small) or of the task switcher (big); the window does not own it.
+  void SetIcon(HICON icon, bool big) const {
+    SendMessage(WM_SETICON, big ? ICON_BIG : ICON_SMALL, reinterpret_cast<LPARAM>(icon));
+  }
   CString GetWindowText() const;
 
   HWND m_hWnd = nullptr;

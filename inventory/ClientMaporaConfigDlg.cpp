@@ -15,7 +15,7 @@ const DWORD kPathChars = MAX_PATH;
 
 // Marks runs of a rich edit the way the report emphasises its headings: bold, in the highlight
 // colour, with no underline or strike-out.
-void EmphasiseRanges(const CWnd& richEdit, const InstallationReport& report) {
+void EmphasiseRanges(const CRichEditCtrl& richEdit, const InstallationReport& report) {
   CHARFORMAT2W format = {};
   format.cbSize = sizeof(format);
   format.dwMask = CFM_BOLD | CFM_UNDERLINE | CFM_STRIKEOUT | CFM_COLOR;
@@ -24,8 +24,8 @@ void EmphasiseRanges(const CWnd& richEdit, const InstallationReport& report) {
   for (const TextRange& range : report.emphasis) {
     const size_t start = RichEditOffset(report.text, range.start);
     const size_t end = RichEditOffset(report.text, range.start + range.length);
-    richEdit.SendMessage(EM_SETSEL, static_cast<WPARAM>(start), static_cast<LPARAM>(end));
-    richEdit.SendMessage(EM_SETCHARFORMAT, SCF_SELECTION, reinterpret_cast<LPARAM>(&format));
+    richEdit.SetSel(start, end);
+    richEdit.SetSelectionCharFormat(format);
   }
 }
 
@@ -97,7 +97,7 @@ void CClientMaporaConfigDlg::BuildInstallationReport() {
   m_richEdit.SetWindowText(report.text);
   fw::TraceStartup("report: headings emphasised");
   EmphasiseRanges(m_richEdit, report);
-  m_richEdit.SendMessage(EM_SETSEL, 0, 0);
+  m_richEdit.SetSel(0, 0);
   fw::TraceStartup("report built");
 }
 

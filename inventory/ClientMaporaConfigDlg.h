@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "framework/Controls.h"
 #include "framework/Dialog.h"
 #include "inventory/AdminSession.h"
 
@@ -25,7 +26,7 @@ class CClientMaporaConfigDlg : public CDialog {
   LRESULT OnAdvanced(WPARAM wParam, LPARAM lParam);
   void UpdateAdvancedButton();
 
-  CWnd m_richEdit;
+  CRichEditCtrl m_richEdit;
 };
 
 // The page object lives as long as the program; its window only while the main window does.
