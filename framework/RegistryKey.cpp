@@ -24,10 +24,7 @@ void RegistryKey::Close() {
   owned_ = false;
 }
 
-LONG RegistryKey::Open(HKEY root, const wchar_t* path) {
-  Close();
-  HKEY key = nullptr;
-  LONG status = ::RegOpenKeyW(root, path, &key);
+LONG RegistryKey::Adopt(LONG status, HKEY key, HKEY root) {
   if (status != ERROR_SUCCESS) return status;
   key_ = key;
   // An empty path hands back root itself, which belongs to whoever opened root.
@@ -35,34 +32,32 @@ LONG RegistryKey::Open(HKEY root, const wchar_t* path) {
   return status;
 }
 
+LONG RegistryKey::Open(HKEY root, const wchar_t* path) {
+  Close();
+  HKEY key = nullptr;
+  const LONG status = ::RegOpenKeyW(root, path, &key);
+  return Adopt(status, key, root);
+}
+
 LONG RegistryKey::Open(HKEY root, const wchar_t* path, REGSAM access) {
   Close();
   HKEY key = nullptr;
-  LONG status = ::RegOpenKeyExW(root, path, 0, access, &key);
-  if (status != ERROR_SUCCESS) return status;
-  key_ = key;
-  owned_ = true;
-  return status;
+  const LONG status = ::RegOpenKeyExW(root, path, 0, access, &key);
+  return Adopt(status, key, root);
 }
 
 LONG RegistryKey::Create(HKEY root, const wchar_t* path) {
   Close();
   HKEY key = nullptr;
-  LONG status = ::RegCreateKeyW(root, path, &key);
-  if (status != ERROR_SUCCESS) return status;
-  key_ = key;
-  owned_ = key != root;
-  return status;
+  const LONG status = ::RegCreateKeyW(root, path, &key);
+  return Adopt(status, key, root);
 }
 
 LONG RegistryKey::Create(HKEY root, const wchar_t* path, REGSAM access) {
   Close();
   HKEY key = nullptr;
-  LONG status = ::RegCreateKeyExW(root, path, 0, nullptr, 0, access, nullptr, &key, nullptr);
-  if (status != ERROR_SUCCESS) return status;
-  key_ = key;
-  owned_ = true;
-  return status;
+  const LONG status = ::RegCreateKeyExW(root, path, 0, nullptr, 0, access, nullptr, &key, nullptr);
+  return Adopt(status, key, root);
 }
 
 LONG RegistryKey::ReadString(const wchar_t* name, std::wstring& out) const {

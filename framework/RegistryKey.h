@@ -43,6 +43,9 @@ class RegistryKey {
   LONG DeleteValue(const wchar_t* name) const;
 
  private:
+  // Takes key when status says it was opened.
+  LONG Adopt(LONG status, HKEY key, HKEY root);
+
   HKEY key_ = nullptr;
   bool owned_ = false;
 };
