@@ -6,8 +6,7 @@
 
 #include <commctrl.h>
 
-#include <cstdio>
-#include <cstring>
+#include <algorithm>
 #include <functional>
 #include <string>
 #include <vector>
@@ -20,10 +19,8 @@ namespace e2e {
 constexpr DWORD kWaitMs = 30000;
 
 inline bool WaitUntil(const std::function<bool()>& condition) {
-  const ULONGLONG deadline = GetTickCount64() + kWaitMs;
-  while (!condition()) {
+  for (const ULONGLONG deadline = GetTickCount64() + kWaitMs; !condition(); Sleep(50)) {
     if (GetTickCount64() >= deadline) return false;
-    Sleep(50);
   }
   return true;
 }
@@ -31,9 +28,7 @@ inline bool WaitUntil(const std::function<bool()>& condition) {
 // Wine's drive Z: is the root of the build machine's file system.
 inline std::wstring WindowsPath(const std::string& hostPath) {
   std::wstring path = L"Z:" + std::wstring(hostPath.begin(), hostPath.end());
-  for (wchar_t& character : path) {
-    if (character == L'/') character = L'\\';
-  }
+  std::replace(path.begin(), path.end(), L'/', L'\\');
   return path;
 }
 
@@ -53,8 +48,7 @@ inline HANDLE Start(std::wstring commandLine) {
 // WM_GETTEXT is carried across processes; the length comes first so that no text is cut.
 inline std::wstring Text(HWND window) {
   std::wstring text(static_cast<size_t>(SendMessageW(window, WM_GETTEXTLENGTH, 0, 0)) + 1, L'\0');
-  const LRESULT length = SendMessageW(window, WM_GETTEXT, text.size(), reinterpret_cast<LPARAM>(&text[0]));
-  text.resize(static_cast<size_t>(length));
+  text.resize(static_cast<size_t>(SendMessageW(window, WM_GETTEXT, text.size(), reinterpret_cast<LPARAM>(&text[0]))));
   return text;
 }
 
@@ -82,24 +76,24 @@ inline void Click(HWND window, int id) { PostMessageW(Control(window, id), BM_CL
 // The console handles one message at a time on its one thread: once it answers this, everything
 // posted before (a click and the writes it makes) is done.
 inline bool WaitForIdle(HWND window) {
-  DWORD_PTR ignored = 0;
-  return SendMessageTimeoutW(window, WM_NULL, 0, 0, SMTO_NORMAL, kWaitMs, &ignored) != 0;
+  return SendMessageTimeoutW(window, WM_NULL, 0, 0, SMTO_NORMAL, kWaitMs, nullptr) != 0;
 }
 
-// A child process (by default the console), terminated when the object goes.
+// A child process (by default the console), terminated when the object goes. environment:
+// "NAME=value" entries for the child only; the test's own has none of these names.
 class Process {
  public:
-  // environment: "NAME=value" entries for the child only; the test's own has none of these names.
   explicit Process(const std::wstring& arguments = L"", const std::wstring& program = ConsolePath(),
                    const std::vector<std::wstring>& environment = {}) {
-    for (const std::wstring& entry : environment) SetVariable(entry, true);
+    for (const std::wstring& entry : environment)
+      SetEnvironmentVariableW(entry.substr(0, entry.find(L'=')).c_str(), entry.substr(entry.find(L'=') + 1).c_str());
     m_process = Start(L"\"" + program + L"\" " + arguments);
-    for (const std::wstring& entry : environment) SetVariable(entry, false);
+    for (const std::wstring& entry : environment)
+      SetEnvironmentVariableW(entry.substr(0, entry.find(L'=')).c_str(), nullptr);
   }
   ~Process() {
-    if (m_process == nullptr) return;
-    if (TerminateProcess(m_process, 1)) WaitForSingleObject(m_process, kWaitMs);
-    CloseHandle(m_process);
+    if (m_process != nullptr && TerminateProcess(m_process, 1)) WaitForSingleObject(m_process, kWaitMs);
+    if (m_process != nullptr) CloseHandle(m_process);
   }
   Process(const Process&) = delete;
   Process& operator=(const Process&) = delete;
@@ -112,36 +106,21 @@ class Process {
     return owner == GetProcessId(m_process) && IsWindowVisible(window);
   }
 
-  // The process's main window: the visible top-level window with the page tree.
-  HWND WaitForMainWindow() const {
-    return WaitForTopLevel(
-        [this](HWND window) { return Shows(window) && GetDlgItem(window, IDC_PAGE_TREE) != nullptr; });
-  }
-
-  // A visible top-level window of the process other than the main window, with that caption: a
-  // dialog, a message box (captioned as the main window is), the help viewer.
-  HWND WaitForWindow(const std::wstring& caption) const {
-    return WaitForTopLevel([this, &caption](HWND window) {
-      return Shows(window) && GetDlgItem(window, IDC_PAGE_TREE) == nullptr && Text(window) == caption;
-    });
-  }
+  // The visible top-level window with the page tree.
+  HWND WaitForMainWindow() const { return WaitForTopLevel(nullptr); }
+  // Another visible top-level window with that caption: a dialog, a message box (captioned as the
+  // main window is), the help viewer.
+  HWND WaitForWindow(const std::wstring& caption) const { return WaitForTopLevel(&caption); }
 
  private:
-  static void SetVariable(const std::wstring& entry, bool set) {
-    const size_t equals = entry.find(L'=');
-    const std::wstring name = entry.substr(0, equals);
-    if (set)
-      SetEnvironmentVariableW(name.c_str(), entry.substr(equals + 1).c_str());
-    else
-      SetEnvironmentVariableW(name.c_str(), nullptr);
-  }
-
-  HWND WaitForTopLevel(const std::function<bool(HWND)>& matches) const {
-    WindowSearch search{matches};
-    WaitUntil([&] {
-      EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search));
-      return search.found != nullptr || !Running();
-    });
+  HWND WaitForTopLevel(const std::wstring* caption) const {
+    WindowSearch search{[&](HWND window) {
+      if (!Shows(window)) return false;
+      if (caption == nullptr) return GetDlgItem(window, IDC_PAGE_TREE) != nullptr;
+      return GetDlgItem(window, IDC_PAGE_TREE) == nullptr && Text(window) == *caption;
+    }};
+    // EnumWindows answers false once the search stops at a match.
+    WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)) || !Running(); });
     return search.found;
   }
 
@@ -150,17 +129,14 @@ class Process {
 
 // TVM_GETITEMW is not carried across processes: the item goes through the console's own memory.
 inline std::wstring TreeRootText(HWND tree) {
-  struct RemoteItem {
+  struct Item {
     TVITEMW item;
     wchar_t text[256];
-  };
+  } local{};
   DWORD processId = 0;
   GetWindowThreadProcessId(tree, &processId);
   HANDLE process = OpenProcess(PROCESS_VM_OPERATION | PROCESS_VM_READ | PROCESS_VM_WRITE, FALSE, processId);
-  if (process == nullptr) return L"";
-  auto* remote =
-      static_cast<RemoteItem*>(VirtualAllocEx(process, nullptr, sizeof(RemoteItem), MEM_COMMIT, PAGE_READWRITE));
-  RemoteItem local{};
+  auto* remote = static_cast<Item*>(VirtualAllocEx(process, nullptr, sizeof(Item), MEM_COMMIT, PAGE_READWRITE));
   if (remote != nullptr) {
     local.item.mask = TVIF_TEXT;
     local.item.hItem = TreeView_GetRoot(tree);
@@ -171,7 +147,7 @@ inline std::wstring TreeRootText(HWND tree) {
       ReadProcessMemory(process, remote, &local, sizeof local, nullptr);
     VirtualFreeEx(process, remote, 0, MEM_RELEASE);
   }
-  CloseHandle(process);
+  if (process != nullptr) CloseHandle(process);
   return local.text;
 }
 
@@ -181,32 +157,25 @@ inline std::wstring ComboText(HWND combo, int index) {
   return text;
 }
 
-// Selects an entry and notifies the owner as a choice made with the mouse does.
+// Selects an entry and tells the owner as a choice made with the mouse does.
 inline void SelectCombo(HWND combo, int index) {
   SendMessageW(combo, CB_SETCURSEL, static_cast<WPARAM>(index), 0);
   PostMessageW(GetParent(combo), WM_COMMAND, MAKEWPARAM(GetDlgCtrlID(combo), CBN_SELCHANGE),
                reinterpret_cast<LPARAM>(combo));
 }
 
-// Saves <build>/screenshots/<name>.png of the window as it is on screen.
+// Saves <build>/screenshots/<name>.png of the window as it is on the screen Wine draws on: under a
+// virtual desktop, the X window Wine names in a property. The picture appears when complete.
 inline bool Screenshot(HWND window, const std::string& name) {
   RECT bounds{};
   GetWindowRect(window, &bounds);
-  const std::string path = std::string(E2E_SCREENSHOT_DIR) + "/" + name + ".png";
-  CreateDirectoryW(WindowsPath(E2E_SCREENSHOT_DIR).c_str(), nullptr);
+  const std::string path = E2E_SCREENSHOT_DIR "/" + name + ".png";
   DeleteFileW(WindowsPath(path).c_str());
-  // The coordinates are those of the screen Wine draws on: the X root window, or under a
-  // virtual desktop the desktop's own X window, which Wine names in this property.
-  char source[32] = "root";
-  if (HANDLE desktop = GetPropW(GetDesktopWindow(), L"__wine_x11_whole_window"))
-    std::snprintf(source, sizeof source, "0x%lx", static_cast<unsigned long>(reinterpret_cast<ULONG_PTR>(desktop)));
-  char command[1024];
-  std::snprintf(command, sizeof command, "/bin/sh \"%s\" %s %ldx%ld+%ld+%ld \"%s\"", E2E_CAPTURE_SCRIPT, source,
-                bounds.right - bounds.left, bounds.bottom - bounds.top, bounds.left, bounds.top, path.c_str());
   RedrawWindow(window, nullptr, nullptr, RDW_UPDATENOW | RDW_ALLCHILDREN);
-  // Wine hands back no handle to wait on for a Linux program: the picture appears when complete.
-  HANDLE capture = Start(std::wstring(command, command + std::strlen(command)));
-  if (capture != nullptr) CloseHandle(capture);
+  const auto desktop = reinterpret_cast<ULONG_PTR>(GetPropW(GetDesktopWindow(), L"__wine_x11_whole_window"));
+  std::string command = "/bin/sh \"" E2E_CAPTURE_SCRIPT "\" \"" + path + "\" " + std::to_string(desktop);
+  for (const LONG edge : {bounds.left, bounds.top, bounds.right, bounds.bottom}) command += " " + std::to_string(edge);
+  if (HANDLE capture = Start(std::wstring(command.begin(), command.end()))) CloseHandle(capture);
   return WaitUntil([&] { return GetFileAttributesW(WindowsPath(path).c_str()) != INVALID_FILE_ATTRIBUTES; });
 }
 
