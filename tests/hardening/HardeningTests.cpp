@@ -1,0 +1,137 @@
+// The console against what it finds on a workstation: a broken language pack, the state the
+// machine-settings probe meets, libraries planted where it must not look for them.
+#include <gtest/gtest.h>
+
+#include "settings/AdvancedSettings.h"
+#include "tests/e2e/ConsoleDriver.h"
+#include "tests/support/TestSupport.h"
+
+using namespace e2e;
+using namespace testing_support;
+
+namespace {
+
+std::string Name(const wchar_t* text) { return std::string(text, text + wcslen(text)); }
+
+// The probe key's path under HKEY_CLASSES_ROOT, from the class key down.
+const std::wstring kClassKey = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
+const std::wstring kProbePath[] = {kClassKey, kClassKey + L"\\Implemented Categories",
+                                   kClassKey + L"\\Implemented Categories\\{40FC6ED5-2438-11CF-A3DB-080036F12502}"};
+
+std::vector<bool> ProbePathPresent() {
+  std::vector<bool> present;
+  for (const std::wstring& path : kProbePath) {
+    HKEY key = nullptr;
+    present.push_back(RegOpenKeyExW(HKEY_CLASSES_ROOT, path.c_str(), 0, KEY_READ, &key) == ERROR_SUCCESS);
+    RegCloseKey(key);
+  }
+  return present;
+}
+
+// Row n: the first n keys of the path exist at the start.
+class MachineSettingsProbe : public testing::TestWithParam<int> {};
+
+TEST_P(MachineSettingsProbe, LeavesTheClassKeyAsFound) {
+  ScopedRegistryKey cleanup(HKEY_CLASSES_ROOT, kClassKey);
+  HKEY key = nullptr;
+  if (GetParam() > 0) {
+    ASSERT_EQ(RegCreateKeyW(HKEY_CLASSES_ROOT, kProbePath[GetParam() - 1].c_str(), &key), ERROR_SUCCESS);
+    RegCloseKey(key);
+  }
+  const std::vector<bool> before = ProbePathPresent();
+  EXPECT_TRUE(CanWriteMachineSettings());  // no suite application runs here
+  EXPECT_EQ(ProbePathPresent(), before);
+}
+
+const char* const kStartingStates[] = {"Nothing", "ClassKeyOnly", "WithCategories", "FullProbeKey"};
+INSTANTIATE_TEST_SUITE_P(StartingStates, MachineSettingsProbe, testing::Range(0, 4),
+                         [](const testing::TestParamInfo<int>& info) {
+                           return std::string(kStartingStates[info.param]);
+                         });
+
+// The main window, its page, the About box and Advanced Configuration, in the order a user meets them.
+const wchar_t* const kFrench[] = {L"Administrateur Mapora", L"Informations de configuration de Mapora :",
+                                  L"\u00c0 propos de l'Administrateur Mapora", L"Configuration avanc\u00e9e"};
+const wchar_t* const kEnglish[] = {L"Mapora Administrator", L"Mapora Configuration Information:",
+                                   L"About Mapora Administrator", L"Advanced Configuration"};
+
+// A French pack without one template (null: the shipped pack), and the first window shown in English.
+class BrokenPack : public testing::TestWithParam<std::pair<const wchar_t*, int>> {};
+
+// The console still opens every window: in French as long as the pack serves, then in English.
+TEST_P(BrokenPack, ConsoleOpensEveryWindow) {
+  const auto [without, firstEnglish] = GetParam();
+  const auto title = [&](int window) { return window < firstEnglish ? kFrench[window] : kEnglish[window]; };
+  wchar_t common[MAX_PATH] = L"";
+  GetEnvironmentVariableW(L"CommonProgramFiles(x86)", common, MAX_PATH);
+  ScopedDirectory pack(MaporaCommonFolder() + L"\\bin\\fr"), desktop(ModuleFolder() + L"\\broken-pack-desktop");
+  ScopedDirectory shared(common + std::wstring(L"\\broken-pack"));  // where the console offers "Advanced..."
+  ScopedRegistryKey desktopKey(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Desktop10.5");
+  ScopedRegistryKey user(HKEY_CURRENT_USER, L"SOFTWARE\\KVEL");
+  desktopKey.SetString(L"InstallDir", desktop.Path());
+  const std::wstring source =
+      without ? WindowsPath(HARDENING_PACKS_DIR) + L"\\" + without : WindowsPath(MAPORA_PACKS_DIR) + L"\\fr";
+  ASSERT_TRUE(CopyFileTo(source + L"\\ResMaporaAdmin.dll", pack.Path() + L"\\ResMaporaAdmin.dll"));
+  ASSERT_TRUE(CopyFileTo(ConsolePath(), shared.Path() + L"\\MaporaAdmin.exe"));
+  Process console(L"/Lang 1036", shared.Path() + L"\\MaporaAdmin.exe", {L"KVEL_DESKTOP10.5_INSTALLED=1"});
+  HWND main = console.WaitForMainWindow();
+  ASSERT_NE(main, nullptr);
+  EXPECT_EQ(Text(main), title(0));
+  HWND page = FindWindowExW(main, nullptr, L"#32770", nullptr);
+  EXPECT_EQ(Text(Control(page, IDC_REPORT_LABEL)), title(1));
+  PostMessageW(main, WM_SYSCOMMAND, IDM_ABOUTBOX, 0);
+  HWND about = console.WaitForWindow(title(2));
+  ASSERT_NE(about, nullptr);
+  Click(about, IDOK);
+  ASSERT_TRUE(WaitUntil([&] { return !IsWindow(about); }));
+  ASSERT_TRUE(WaitUntil([&] { return IsWindowVisible(Control(page, IDC_ADVANCED)) != FALSE; }));
+  Click(page, IDC_ADVANCED);
+  EXPECT_NE(console.WaitForWindow(title(3)), nullptr);
+}
+
+INSTANTIATE_TEST_SUITE_P(Templates, BrokenPack,
+                         testing::Values(std::make_pair(nullptr, 4), std::make_pair(L"IDD_MAPORAADMIN_DIALOG", 0),
+                                         std::make_pair(L"IDD_MAPORA_CONFIG", 1), std::make_pair(L"IDD_ABOUTBOX", 2),
+                                         std::make_pair(L"IDD_ADVANCED_CONFIG", 3)),
+                         [](const testing::TestParamInfo<std::pair<const wchar_t*, int>>& info) {
+                           return info.param.first ? Name(info.param.first).substr(4) : "Complete";
+                         });
+
+// Planted beside a copy of the console and in its working folder, under the name of a system library
+// the console uses: the library never runs and the console opens as usual. version.dll is not among
+// them: under Wine a planted copy runs before the console's first instruction, as Wine's own user32
+// imports it; CheckImports.cmake checks that the console does not.
+class PlantedLibrary : public testing::TestWithParam<const wchar_t*> {};
+
+TEST_P(PlantedLibrary, NeverRuns) {
+  const std::wstring library = GetParam();
+  ScopedDirectory program(ModuleFolder() + L"\\planted-program"), work(ModuleFolder() + L"\\planted-work");
+  ASSERT_TRUE(CopyFileTo(ConsolePath(), program.Path() + L"\\MaporaAdmin.exe"));
+  for (const ScopedDirectory* folder : {&program, &work})
+    ASSERT_TRUE(CopyFileTo(WindowsPath(HARDENING_MARKERS_DIR) + L"\\" + library, folder->Path() + L"\\" + library));
+  // Wine prefers its built-in libraries, Windows the first file its search finds; Wine takes its
+  // overrides for a program started from a Windows process from the registry.
+  ScopedRegistryKey appDefaults(HKEY_CURRENT_USER, L"Software\\Wine\\AppDefaults\\MaporaAdmin.exe");
+  for (const wchar_t* name : {L"riched20", L"riched32", L"gdiplus"})
+    SetRegistryString(HKEY_CURRENT_USER, L"Software\\Wine\\AppDefaults\\MaporaAdmin.exe\\DllOverrides", name,
+                      L"native,builtin");
+  wchar_t previous[MAX_PATH] = L"";
+  GetCurrentDirectoryW(MAX_PATH, previous);
+  SetCurrentDirectoryW(work.Path().c_str());
+  Process console(L"", program.Path() + L"\\MaporaAdmin.exe");
+  SetCurrentDirectoryW(previous);
+  HWND main = console.WaitForMainWindow();
+  ASSERT_NE(main, nullptr);
+  // The report is a rich edit control: the system's rich edit library was loaded after all.
+  EXPECT_NE(GetDlgItem(FindWindowExW(main, nullptr, L"#32770", nullptr), IDC_REPORT), nullptr);
+  for (const ScopedDirectory* folder : {&program, &work})
+    EXPECT_EQ(GetFileAttributesW((folder->Path() + L"\\" + library + L".ran").c_str()), INVALID_FILE_ATTRIBUTES)
+        << "loaded from " << folder->Path();
+}
+
+INSTANTIATE_TEST_SUITE_P(Libraries, PlantedLibrary, testing::Values(L"RICHED32.DLL", L"RICHED20.DLL", L"gdiplus.dll"),
+                         [](const testing::TestParamInfo<const wchar_t*>& info) {
+                           return Name(info.param).substr(0, Name(info.param).find('.'));
+                         });
+
+}  // namespace

@@ -1,0 +1,273 @@
+// The Group Policy templates in policy/, and the real console under Wine after each policy has written its values.
+#include <gtest/gtest.h>
+#include <msxml2.h>
+
+#include <regex>
+#include <set>
+
+#include "framework/ComRef.h"
+#include "inventory/ProductRegistry.h"
+#include "locale/LocaleInternals.h"
+#include "locale/SuiteUserSettings.h"
+#include "settings/SettingsRegistry.h"
+#include "tests/e2e/ConsoleDriver.h"
+#include "tests/support/TestSupport.h"
+
+using namespace e2e;
+using namespace testing_support;
+
+namespace {
+
+using Node = ComRef<IXMLDOMNode>;
+using Bag = std::multiset<std::wstring>;
+
+const std::vector<std::wstring> kPackTags{MAPORA_PACK_TAGS};
+// Each template language with the console pack it matches (none for English).
+const std::pair<const wchar_t*, const wchar_t*> kTemplateLanguages[] = {
+    {L"en-US", nullptr}, {L"fr-FR", L"fr"},    {L"de-DE", L"de"}, {L"es-ES", L"es"},
+    {L"ja-JP", L"ja"},   {L"zh-CN", L"zh-CN"}, {L"ar-SA", L"ar"}};
+// The values a policy writes when disabled, and when enabled (each item of an enum at once).
+const wchar_t* const kStates[] = {L"p:disabledValue | p:disabledList/p:item/p:value",
+                                  L"p:enabledValue | p:enabledList/p:item/p:value | p:elements/*[not(self::p:enum)]"
+                                  L" | p:elements/p:enum/p:item/p:value"};
+constexpr wchar_t kUnread[] = L"(a kind of value the suite does not read)";
+constexpr wchar_t kPackFile[] = L"\\ResMaporaAdmin.dll";
+constexpr wchar_t kEnglish[] = L"Mapora Administrator";
+constexpr CLSID kParser = {0x88d96a05, 0xf192, 0x11d4, {0xa6, 0x5f, 0x00, 0x40, 0x96, 0x32, 0x51, 0xe5}};
+constexpr IID kDocument2 = {0x2933bf95, 0x7b36, 0x11d2, {0xb2, 0x0e, 0x00, 0xc0, 0x4f, 0x98, 0x3e, 0x60}};
+
+struct Variant : VARIANT {
+  explicit Variant(const std::wstring& text) : VARIANT{} {
+    vt = VT_BSTR;
+    bstrVal = SysAllocString(text.c_str());
+  }
+  ~Variant() { VariantClear(this); }
+};
+
+// A file of policy/ as the system's parser reads it; error holds the parser's reason.
+struct Xml {
+  explicit Xml(const std::wstring& name) {
+    CoInitializeEx(nullptr, COINIT_APARTMENTTHREADED);
+    if (FAILED(CoCreateInstance(kParser, nullptr, CLSCTX_INPROC_SERVER, kDocument2, document.ReceiveVoid()))) return;
+    document->put_async(VARIANT_FALSE);
+    document->setProperty(Variant(L"SelectionNamespaces").bstrVal,
+                          Variant(L"xmlns:p='http://schemas.microsoft.com/GroupPolicy/2006/07/PolicyDefinitions'"));
+    VARIANT_BOOL loaded = VARIANT_FALSE;
+    ComRef<IXMLDOMParseError> parseError;
+    BSTR reason = nullptr;
+    if (document->load(Variant(WindowsPath(MAPORA_POLICY_DIR) + L"\\" + name), &loaded) == S_OK) return;
+    if (SUCCEEDED(document->get_parseError(parseError.Receive())) && parseError) parseError->get_reason(&reason);
+    error = name + L": " + (reason ? reason : L"");
+    SysFreeString(reason);
+  }
+  operator IXMLDOMNode*() const { return document.Get(); }
+  ComRef<IXMLDOMDocument2> document;
+  std::wstring error;
+};
+
+std::vector<Node> Select(IXMLDOMNode* context, const std::wstring& xpath) {
+  std::vector<Node> nodes;
+  ComRef<IXMLDOMNodeList> list;
+  if (context) context->selectNodes(Variant(xpath).bstrVal, list.Receive());
+  for (Node node; list && list->nextNode(node.Receive()) == S_OK && node;) nodes.push_back(std::move(node));
+  return nodes;
+}
+
+std::vector<std::wstring> Strings(IXMLDOMNode* context, const std::wstring& xpath) {
+  std::vector<std::wstring> strings;
+  for (const Node& node : Select(context, xpath)) {
+    BSTR text = nullptr;
+    node->get_text(&text);
+    strings.emplace_back(text ? text : L"");
+    SysFreeString(text);
+  }
+  return strings;
+}
+
+std::wstring String(IXMLDOMNode* context, const std::wstring& xpath) {
+  const std::vector<std::wstring> strings = Strings(context, xpath);
+  return strings.empty() ? L"" : strings.front();
+}
+
+Bag BagOf(const std::vector<std::wstring>& strings) { return Bag(strings.begin(), strings.end()); }
+
+std::wstring Upper(std::wstring text) {
+  CharUpperBuffW(&text[0], static_cast<DWORD>(text.size()));
+  return text;
+}
+
+// The data of a value element (or of another kind of element): a decimal, or "-" for a deletion.
+std::wstring Data(IXMLDOMNode* value) {
+  if (!Select(value, L"p:delete").empty()) return L"-";
+  const std::vector<std::wstring> decimal = Strings(value, L"p:decimal/@value");
+  return decimal.empty() ? kUnread : decimal.front();
+}
+
+// "HKLM\KEY\VALUE NAME=data", key and value name from the nearest element that names them.
+std::wstring Write(IXMLDOMNode* node, const std::wstring& data) {
+  const bool machine = String(node, L"ancestor-or-self::p:policy/@class") == L"Machine";
+  return Upper((machine ? L"HKLM\\" : L"HKCU\\") +
+               String(node, L"ancestor-or-self::*[@key or @defaultKey][1]/@*[name()='key' or name()='defaultKey']") +
+               L"\\" + String(node, L"ancestor-or-self::*[@valueName][1]/@valueName")) +
+         L"=" + data;
+}
+
+unsigned short LangId(const std::wstring& language) {
+  unsigned short langId = 0xFFFF;
+  KVELLocale::GetLangIDFromName(language.c_str(), langId);
+  return langId;
+}
+
+std::vector<std::wstring> Markers(const std::wstring& text) {  // printf conversions and %1 inserts
+  static const std::wregex marker(L"%(%|[-+ #0]*[0-9*]*(\\.[0-9*]+)?[hlLwzjtI36]*[diouxXcCsSeEfgGaAp]|[1-9][0-9]?|)");
+  std::vector<std::wstring> markers;
+  for (std::wsregex_iterator m(text.begin(), text.end(), marker), end; m != end; ++m)
+    if (m->str() != L"%%") markers.push_back(m->str());
+  return markers;
+}
+
+TEST(PolicyTemplate, ParsesWithTheSystemParser) {
+  std::vector<std::wstring> files{L"Mapora.admx"};
+  for (const auto& language : kTemplateLanguages) files.push_back(language.first + std::wstring(L"\\Mapora.adml"));
+  for (const std::wstring& file : files) {
+    const Xml xml(file);
+    EXPECT_EQ(xml.error, L"");
+    const wchar_t* root = file == files[0] ? L"/p:policyDefinitions" : L"/p:policyDefinitionResources";
+    EXPECT_EQ(Select(xml, root).size(), 1u) << file;
+  }
+}
+
+// Each string and presentation the template names defined once, no others; each string with the
+// English placeholders, each presentation showing exactly the elements of its policy.
+TEST(PolicyTemplate, EveryLanguageDefinesExactlyWhatTheTemplateUses) {
+  const Xml admx(L"Mapora.admx"), english(L"en-US\\Mapora.adml");
+  for (const auto& language : kTemplateLanguages) {
+    const Xml adml(language.first + std::wstring(L"\\Mapora.adml"));
+    for (const std::wstring kind : {L"string", L"presentation"}) {
+      SCOPED_TRACE(std::wstring(language.first) + L" " + kind);
+      std::set<std::wstring> used;
+      for (const std::wstring& reference : Strings(admx, L"//@*[starts-with(., '$(" + kind + L".')]"))
+        used.insert(reference.substr(kind.size() + 3, reference.size() - kind.size() - 4));
+      EXPECT_EQ(BagOf(Strings(adml, L"//p:" + kind + L"/@id")), Bag(used.begin(), used.end()));
+      for (const std::wstring& id : used) {
+        const std::wstring defined = L"//p:" + kind + L"[@id='" + id + L"']";
+        if (kind == L"string") {
+          EXPECT_EQ(Markers(String(adml, defined)), Markers(String(english, defined))) << id;
+        } else {
+          EXPECT_EQ(BagOf(Strings(adml, defined + L"/*/@refId")),
+                    BagOf(Strings(admx, L"//p:policy[@presentation='$(presentation." + id + L")']/p:elements/*/@id")));
+        }
+      }
+    }
+  }
+}
+
+// Names as the code reads them; a per-machine policy writes the WOW6432Node copy (where a 32-bit
+// program on 64-bit Windows reads the same key) alike, a per-user one writes none.
+TEST(PolicyTemplate, WritesOnlyTheValuesTheSuiteReadsInBothViews) {
+  const std::set<std::wstring> read{
+      Upper(L"HKCU\\" + std::wstring(kSuiteUserKey) + L"\\" + kUILangIDValue),
+      Upper(L"HKLM\\" + EnableKueiKey(DesktopKey()) + L"\\" + kEnableKueiValue),
+      Upper(L"HKCU\\" + std::wstring(kConnectionSettingsKey) + L"\\" + kSupportLocalPortalValue),
+      Upper(L"HKLM\\" + std::wstring(kPortalMachineSettingsKey) + L"\\" + kPortalServerSetByAdminValue)};
+  const Xml admx(L"Mapora.admx");
+  std::set<std::wstring> written;
+  for (const Node& policy : Select(admx, L"//p:policy")) {
+    for (const wchar_t* state : kStates) {
+      SCOPED_TRACE(String(policy.Get(), L"@name") + L": " + state);
+      Bag views[2];  // native, WOW6432Node
+      for (const Node& value : Select(policy.Get(), state)) {
+        std::wstring write = Write(value.Get(), Data(value.Get()));
+        const bool wow = write.compare(4, 22, L"\\SOFTWARE\\WOW6432NODE\\") == 0;
+        if (wow) write.erase(14, 12);
+        const std::wstring name = write.substr(0, write.find(L'='));
+        EXPECT_EQ(read.count(name), 1u) << name;
+        EXPECT_NE(write.substr(name.size() + 1), kUnread) << name;
+        written.insert(name);
+        views[wow].insert(write);
+      }
+      EXPECT_EQ(views[1], String(policy.Get(), L"@class") == L"Machine" ? views[0] : Bag());
+    }
+  }
+  EXPECT_EQ(written, read);
+}
+
+// Each pack the build makes has its template language and its entry in the language list, which
+// offers what the console stores for English and each pack (for the Windows language: no value).
+TEST(PolicyTemplate, EveryPackIsTranslatedAndOffered) {
+  std::set<std::wstring> translated;
+  for (const auto& language : kTemplateLanguages)
+    if (language.second) translated.insert(language.second);
+  EXPECT_EQ(translated, std::set<std::wstring>(kPackTags.begin(), kPackTags.end()));
+  const Xml admx(L"Mapora.admx");
+  Bag offered, expected{L"-", std::to_wstring(LangId(L"en"))};
+  for (const Node& value : Select(admx, L"//p:policy[@name='DisplayLanguage']//p:enum/p:item/p:value"))
+    offered.insert(Data(value.Get()));
+  for (const std::wstring& tag : kPackTags) expected.insert(std::to_wstring(LangId(tag)));
+  EXPECT_EQ(offered, expected);
+}
+
+using ControlState = std::tuple<int, LRESULT, bool>;  // id, BM_GETCHECK, enabled
+struct ConsoleCase {
+  const char* policy;
+  const wchar_t *pack, *title;  // pack: the language chosen
+  std::vector<ControlState> controls;
+};
+
+class PolicyConsole : public testing::TestWithParam<ConsoleCase> {};
+
+// Desktop with every pack installed, and the console in the shared 32-bit folder, where it offers "Advanced...":
+// after the policy's values are written as the Group Policy client writes them, the console shows them.
+TEST_P(PolicyConsole, ShowsWhatThePolicyWrote) {
+  const ConsoleCase& row = GetParam();
+  ScopedRegistryKey machine(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL"), user(HKEY_CURRENT_USER, kSuiteUserKey);
+  ScopedRegistryKey machine32(HKEY_LOCAL_MACHINE, L"SOFTWARE\\WOW6432Node\\KVEL");
+  ScopedDirectory desktop(ModuleFolder() + L"\\policy-desktop"), packs(MaporaCommonFolder() + L"\\bin");
+  wchar_t common[MAX_PATH] = L"";
+  GetEnvironmentVariableW(L"CommonProgramFiles(x86)", common, MAX_PATH);
+  ScopedDirectory shared(common + std::wstring(L"\\e2e-policy"));
+  SetRegistryString(HKEY_LOCAL_MACHINE, DesktopKey(), L"InstallDir", desktop.Path());
+  for (const std::wstring& tag : kPackTags) {
+    desktop.MakeDir(L"bin\\" + tag);
+    CopyFileTo(WindowsPath(MAPORA_PACKS_DIR) + L"\\" + tag + kPackFile, packs.Path() + L"\\" + tag + kPackFile);
+  }
+  CopyFileTo(ConsolePath(), shared.Path() + L"\\MaporaAdmin.exe");
+  const Xml admx(L"Mapora.admx");
+  const std::vector<Node> policy =
+      Select(admx, L"//p:policy[@name='" + std::wstring(row.policy, row.policy + strlen(row.policy)) + L"']");
+  ASSERT_EQ(policy.size(), 1u);
+  const unsigned short langId = row.pack ? LangId(row.pack) : 0;
+  std::wstring values = kStates[1];
+  if (row.pack) values = L"p:elements//p:value[p:decimal/@value='" + std::to_wstring(langId) + L"']";
+  for (const Node& value : Select(policy.front().Get(), values)) {
+    const std::wstring write = Write(value.Get(), Data(value.Get()));
+    const size_t equals = write.find(L'='), slash = write.rfind(L'\\', equals);
+    SetRegistryDword(write.compare(0, 4, L"HKLM") ? HKEY_CURRENT_USER : HKEY_LOCAL_MACHINE, write.substr(5, slash - 5),
+                     write.substr(slash + 1, equals - slash - 1).c_str(), std::stoul(write.substr(equals + 1)));
+  }
+  Process console(L"", shared.Path() + L"\\MaporaAdmin.exe", {L"KVEL_DESKTOP10.5_INSTALLED=1"});
+  HWND main = console.WaitForMainWindow();
+  ASSERT_NE(main, nullptr);
+  ASSERT_TRUE(WaitUntil([&] { return IsWindowVisible(Control(main, IDC_ADVANCED)) != FALSE; }));
+  EXPECT_EQ(Text(main), row.title);
+  Click(main, IDC_ADVANCED);
+  WindowSearch search{[&](HWND w) { return console.Shows(w) && GetDlgItem(w, IDC_LANGUAGE_LIST); }};
+  ASSERT_TRUE(WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)); }));
+  HWND list = Control(search.found, IDC_LANGUAGE_LIST);
+  EXPECT_EQ(SendMessageW(list, CB_GETITEMDATA, SendMessageW(list, CB_GETCURSEL, 0, 0), 0), LRESULT{langId});
+  for (const auto& [id, checked, enabled] : row.controls) {
+    EXPECT_EQ(SendMessageW(Control(search.found, id), BM_GETCHECK, 0, 0), checked) << id;
+    EXPECT_EQ(IsWindowEnabled(Control(search.found, id)) != FALSE, enabled) << id;
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Policies, PolicyConsole,
+    testing::Values(ConsoleCase{"DisplayLanguage", L"zh-CN", L"Mapora \u7ba1\u7406\u5668", {}},
+                    ConsoleCase{"ImprovementProgram", nullptr, kEnglish, {{IDC_KUEI_CHECK, BST_CHECKED, true}}},
+                    ConsoleCase{"SupportLocalPortal", nullptr, kEnglish, {{IDC_LOCAL_PORTAL, BST_CHECKED, true}}},
+                    ConsoleCase{
+                        "PortalServerSetByAdmin", nullptr, kEnglish, {{IDC_MANAGE_PORTALS, BST_UNCHECKED, false}}}),
+    [](const testing::TestParamInfo<ConsoleCase>& info) { return std::string(info.param.policy); });
+
+}  // namespace
