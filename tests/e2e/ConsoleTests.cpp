@@ -31,7 +31,7 @@ std::wstring Environment(const wchar_t* name) {
 }
 
 // The console as installed, on a German Windows (LANG de_DE) that no pack serves: a copy in the
-// 32-bit common program files folder, where only "Advanced..." shows; Desktop with an Austrian
+// 32-bit common program files folder (only there does "Advanced..." show); Desktop with an Austrian
 // German pack, a service pack and its help in English and French; French and Arabic packs.
 class Console : public testing::Test {
  protected:
@@ -53,7 +53,7 @@ class Console : public testing::Test {
   }
 
   // Starts the console; its main window, or null.
-  HWND Start(const std::wstring& arguments = L"") {
+  HWND Launch(const std::wstring& arguments = L"") {
     m_console = std::make_unique<Process>(arguments, m_shared.Path() + L"\\MaporaAdmin.exe",
                                           std::vector<std::wstring>{L"KVEL_DESKTOP10.5_INSTALLED=1"});
     return m_console->WaitForMainWindow();
@@ -89,7 +89,7 @@ TEST_F(Console, MainWindowInTheLanguageOfThePackWithItsHelp) {
   };
   for (const auto& row : rows) {
     SCOPED_TRACE(row.name);
-    HWND main = Start(row.arguments);
+    HWND main = Launch(row.arguments);
     ASSERT_NE(main, nullptr);
     HWND page = FindWindowExW(main, nullptr, L"#32770", nullptr);
     EXPECT_EQ(Text(main), row.title);
@@ -104,7 +104,7 @@ TEST_F(Console, MainWindowInTheLanguageOfThePackWithItsHelp) {
 }
 
 TEST_F(Console, AboutBoxShowsTheDesktopServicePack) {
-  HWND main = Start();
+  HWND main = Launch();
   ASSERT_NE(main, nullptr);
   PostMessageW(main, WM_SYSCOMMAND, IDM_ABOUTBOX, 0);
   HWND about = m_console->WaitForWindow(L"About Mapora Administrator");
@@ -115,7 +115,7 @@ TEST_F(Console, AboutBoxShowsTheDesktopServicePack) {
 }
 
 TEST_F(Console, AdvancedConfigurationWarnsAndSavesTheChoices) {
-  HWND main = Start();
+  HWND main = Launch();
   ASSERT_NE(main, nullptr);
   ASSERT_TRUE(WaitUntil([&] { return IsWindowVisible(Control(main, IDC_ADVANCED)) != FALSE; }));
   Click(main, IDC_ADVANCED);
@@ -139,7 +139,7 @@ TEST_F(Console, AdvancedConfigurationWarnsAndSavesTheChoices) {
 // The stored language is removed behind the console's back: afterwards it holds what OK wrote.
 TEST_F(Console, OKStoresTheLanguageOnceNoSuiteApplicationRuns) {
   m_user.SetDword(L"UILANGID", 0x0407);
-  HWND main = Start();
+  HWND main = Launch();
   ASSERT_NE(main, nullptr);
   m_user.DeleteValue(L"UILANGID");
   {
