@@ -23,15 +23,16 @@ struct Outcome {
   std::string output[3];  // standard output, standard error, and what "--out report.txt" wrote
 };
 
-// MaporaReport run by cmd in a scratch folder with the marker ("NAME=value") set. No run may change
-// HKLM\SOFTWARE or HKCU (HKLM\SYSTEM is left out: Wine's display driver refreshes it for every process).
+// MaporaReport run by cmd in a scratch folder with the marker ("NAME=value") set. No run may change HKLM\SOFTWARE
+// or the suite's per-user key (tests running alongside use HKCU, Wine's display driver HKLM\SYSTEM).
 Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kDesktop) {
   ScopedDirectory folder(ModuleFolder() + L"\\reporttool-run");
   folder.MakeDir(L".");
-  HKEY software = nullptr;
+  HKEY software = nullptr, suite = nullptr;
   HANDLE changed = CreateEventW(nullptr, TRUE, FALSE, nullptr);
   RegOpenKeyExW(HKEY_LOCAL_MACHINE, L"SOFTWARE", 0, KEY_NOTIFY, &software);
-  for (HKEY key : {software, HKEY_CURRENT_USER})
+  RegCreateKeyExW(HKEY_CURRENT_USER, L"Software\\KVEL", 0, nullptr, 0, KEY_NOTIFY, nullptr, &suite, nullptr);
+  for (HKEY key : {software, suite})
     RegNotifyChangeKeyValue(key, TRUE, REG_NOTIFY_CHANGE_NAME | REG_NOTIFY_CHANGE_LAST_SET, changed, TRUE);
   HANDLE process = Start(L"cmd /c \"cd /d \"" + folder.Path() + L"\" && set \"" + marker + L"\" && \"" +
                          WindowsPath(MAPORA_REPORT_EXE) + L"\" " + arguments + L" >out 2>err\"");
@@ -40,7 +41,7 @@ Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kD
   GetExitCodeProcess(process, &run.exitCode);
   CloseHandle(process);
   EXPECT_EQ(WaitForSingleObject(changed, 0), static_cast<DWORD>(WAIT_TIMEOUT)) << "registry changed by " << arguments;
-  RegCloseKey(software);
+  for (HKEY key : {software, suite}) RegCloseKey(key);
   CloseHandle(changed);
   const wchar_t* const files[] = {L"\\out", L"\\err", L"\\report.txt"};
   for (int i = 0; i < 3; ++i) {
@@ -50,16 +51,15 @@ Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kD
   return run;
 }
 
-// Desktop (text beyond ASCII, its core library in place) and Skyloft installed, no suite settings stored.
+// Desktop (text beyond ASCII) and Skyloft installed, no suite settings stored.
 struct Workstation : testing::Test {
   Workstation() {
-    SetRegistryString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Desktop10.5", L"InstallDir", folder_.Path());
+    SetRegistryString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Desktop10.5", L"InstallDir", L"C:\\Mapora");
     SetRegistryString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Desktop10.5", L"ProductName", L"Kv\u00e9l \u5730\u56f3");
     SetRegistryString(HKEY_LOCAL_MACHINE, L"SOFTWARE\\Kvel\\Skyloft2016.1", L"InstallDir", L"C:\\Skyloft");
-    EXPECT_TRUE(CopyFileTo(WindowsPath(MAPORA_PFCORE_DLL), folder_.Path() + L"\\bin\\pfcore.dll"));
   }
 
-  ScopedDirectory folder_{ModuleFolder() + L"\\reporttool-desktop"}, packs_{MaporaCommonFolder() + L"\\bin"};
+  ScopedDirectory packs_{MaporaCommonFolder() + L"\\bin"};
   ScopedRegistryKey machine_{HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL"}, user_{HKEY_CURRENT_USER, L"SOFTWARE\\KVEL"};
 };
 
@@ -101,7 +101,7 @@ TEST_F(Workstation, JsonCarriesTheRegistryValues) {
       {L"InstallDate", REG_SZ, L"\x01\x1f\t\n\r\"\\\x7f/", "/products/server/installDate", "\x01\x1f\t\n\r\"\\\x7f/"},
       {L"InstallTime", REG_SZ, L"x\xD800y", "/products/server/installTime", "x\xEF\xBF\xBDy"},
       {L"SPDisplayName", REG_SZ, L"\xD83D\xDDFA", "/products/server/spDisplayName", "\xF0\x9F\x97\xBA"},  // a pair
-      {nullptr, 0, L"", "/products/desktop/productVersion", "10.5.0.6491"},  // from the core library
+      {nullptr, 0, L"", "/products/desktop/installDir", "C:\\Mapora"},
       {nullptr, 0, L"", "/products/skyloft/installDir", "C:\\Skyloft"},
       {nullptr, 0, L"", "/settings", Json::parse(R"({"displayLanguage":{"uiLangId":0,"followsWindows":true},
       "improvementProgram":{"enableKuei":2,"on":true},"localPortalSupport":false,"portalServerSetByAdmin":true})")}};
