@@ -24,15 +24,16 @@ struct Outcome {
 };
 
 // MaporaReport run by cmd in a scratch folder with the marker ("NAME=value") set. No run may change HKLM\SOFTWARE
-// or the suite's per-user key (tests running alongside use HKCU, Wine's display driver HKLM\SYSTEM).
+// or HKCU (Wine's display driver refreshes HKLM\SYSTEM for every process; the test runs alone, see CMakeLists).
 Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kDesktop) {
   ScopedDirectory folder(ModuleFolder() + L"\\reporttool-run");
   folder.MakeDir(L".");
-  HKEY software = nullptr, suite = nullptr;
+  HKEY software = nullptr;
+  HKEY user = nullptr;
   HANDLE changed = CreateEventW(nullptr, TRUE, FALSE, nullptr);
   RegOpenKeyExW(HKEY_LOCAL_MACHINE, L"SOFTWARE", 0, KEY_NOTIFY, &software);
-  RegCreateKeyExW(HKEY_CURRENT_USER, L"Software\\KVEL", 0, nullptr, 0, KEY_NOTIFY, nullptr, &suite, nullptr);
-  for (HKEY key : {software, suite})
+  RegOpenKeyExW(HKEY_CURRENT_USER, L"", 0, KEY_NOTIFY, &user);
+  for (HKEY key : {software, user})
     RegNotifyChangeKeyValue(key, TRUE, REG_NOTIFY_CHANGE_NAME | REG_NOTIFY_CHANGE_LAST_SET, changed, TRUE);
   HANDLE process = Start(L"cmd /c \"cd /d \"" + folder.Path() + L"\" && set \"" + marker + L"\" && \"" +
                          WindowsPath(MAPORA_REPORT_EXE) + L"\" " + arguments + L" >out 2>err\"");
@@ -41,7 +42,7 @@ Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kD
   GetExitCodeProcess(process, &run.exitCode);
   CloseHandle(process);
   EXPECT_EQ(WaitForSingleObject(changed, 0), static_cast<DWORD>(WAIT_TIMEOUT)) << "registry changed by " << arguments;
-  for (HKEY key : {software, suite}) RegCloseKey(key);
+  for (HKEY key : {software, user}) RegCloseKey(key);
   CloseHandle(changed);
   const wchar_t* const files[] = {L"\\out", L"\\err", L"\\report.txt"};
   for (int i = 0; i < 3; ++i) {
