@@ -8,7 +8,6 @@
 #include "inventory/RunningSuiteApps.h"
 #include "framework/App.h"
 #include "framework/PngResource.h"
-#include "framework/RegistryKey.h"
 #include "framework/StartupTrace.h"
 #include "inventory/ClientMaporaConfigDlg.h"
 #include "locale/KVELLocale.h"
@@ -17,25 +16,13 @@
 
 namespace {
 
-constexpr DWORD kNoStoredLanguage = 0xFFFFFFFF;
-
 const wchar_t kHelpFileName[] = L"administering_mapora_desktop.chm";
 const wchar_t kHelpTopic[] = L"00030000000r000000.htm";
-
-// Computer names are at most 15 characters (MAX_COMPUTERNAME_LENGTH).
-constexpr DWORD kComputerNameChars = 16;
 
 // Tree images come with white behind their transparent parts; pure blue marks what the image
 // list treats as transparent.
 constexpr COLORREF kPngBackground = RGB(255, 255, 255);
 constexpr COLORREF kTreeMaskColor = RGB(0, 0, 255);
-
-CString ComputerName() {
-  wchar_t name[kComputerNameChars] = L"";
-  DWORD size = kComputerNameChars;
-  if (!GetComputerNameW(name, &size)) return CString();
-  return name;
-}
 
 }  // namespace
 
@@ -50,14 +37,15 @@ void CClientAdminDlg::DoDataExchange(CDataExchange* pDX) {
 }
 
 const MessageMap* CClientAdminDlg::GetMessageMap() const {
+  using Self = CClientAdminDlg;
   static const MessageMapEntry entries[] = {
-      {WM_SYSCOMMAND, 0, 0, Handler(&CClientAdminDlg::OnSysCommand)},
-      {WM_DESTROY, 0, 0, Handler(&CClientAdminDlg::OnDestroy)},
-      {WM_PAINT, 0, 0, Handler(&CClientAdminDlg::OnPaint)},
-      {WM_QUERYDRAGICON, 0, 0, Handler(&CClientAdminDlg::OnQueryDragIcon)},
-      {WM_COMMAND, IDC_APPLY_NOW, BN_CLICKED, Handler(&CClientAdminDlg::OnApply)},
-      {WM_NOTIFY, IDC_PAGE_TREE, static_cast<UINT>(TVN_SELCHANGEDW), Handler(&CClientAdminDlg::OnTreeSelChanged)},
-      {WM_COMMANDHELP, 0, 0, Handler(&CClientAdminDlg::OnCommandHelp)},
+      fw::OnSysCommand<&Self::OnSysCommand>(),
+      fw::OnMessage<&Self::OnDestroy>(WM_DESTROY),
+      fw::OnMessage<&Self::OnPaint>(WM_PAINT),
+      fw::OnMessage<&Self::OnQueryDragIcon>(WM_QUERYDRAGICON),
+      fw::OnCommand<&Self::OnApply>(IDC_APPLY_NOW, BN_CLICKED),
+      fw::OnNotify<&Self::OnTreeSelChanged>(IDC_PAGE_TREE, static_cast<UINT>(TVN_SELCHANGEDW)),
+      fw::OnMessage<&Self::OnCommandHelp>(WM_COMMANDHELP),
   };
   static const MessageMap map = {CDialog::GetMessageMap(), entries, std::size(entries)};
   return &map;
@@ -104,8 +92,7 @@ void CClientAdminDlg::LoadSettings() {
   fw::TraceStartup("OnInitDialog: product detection");
   DetectInstalledProducts(m_installedProducts);
   fw::TraceStartup("OnInitDialog: UILANGID");
-  DWORD storedLanguage = ReadRegistryDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue, kNoStoredLanguage);
-  if (storedLanguage != kNoStoredLanguage) m_dwUILangID = storedLanguage;
+  if (const std::optional<DWORD> stored = ReadStoredUILangID()) m_dwUILangID = *stored;
   fw::TraceStartup("OnInitDialog: machine-settings probe");
   m_machineSettingsWritable = CanWriteMachineSettings();
 }
@@ -114,7 +101,7 @@ void CClientAdminDlg::BuildPageTree() {
   CClientMaporaConfigDlg& rootPage = GetRootPage();
   if (m_bPagesCreated) rootPage.DestroyWindow();
   m_wndTree.DeleteAllItems();
-  m_hRootItem = m_wndTree.InsertItem(fw::FormatString(IDS_WORKSTATION_NODE, ComputerName().c_str()), 0, 0);
+  m_hRootItem = m_wndTree.InsertItem(fw::FormatString(IDS_WORKSTATION_NODE, fw::ComputerName().c_str()), 0, 0);
 
   // The page places itself beside the tree: its template carries its position.
   rootPage.m_pAdminDlg = this;
@@ -155,16 +142,14 @@ void CClientAdminDlg::ShowSelectedPage() {
   }
 }
 
-LRESULT CClientAdminDlg::OnTreeSelChanged(WPARAM, LPARAM) {
+LRESULT CClientAdminDlg::OnTreeSelChanged(NMHDR*) {
   ShowSelectedPage();
   return 0;
 }
 
-void CClientAdminDlg::EnableApply() { EnableItem(IDC_APPLY_NOW, true); }
-
 void CClientAdminDlg::OpenAdvancedSettings() { PersistAdvancedSettings(*this); }
 
-LRESULT CClientAdminDlg::OnCommandHelp(WPARAM, LPARAM) {
+LRESULT CClientAdminDlg::OnCommandHelp() {
   UINT helpId = GetHelpID();
   // The About command's number lies in the help range but has no topic.
   if (helpId >= IDH_FIRST && helpId <= IDH_LAST && helpId != IDM_ABOUTBOX) {
@@ -174,12 +159,11 @@ LRESULT CClientAdminDlg::OnCommandHelp(WPARAM, LPARAM) {
   return TRUE;
 }
 
-LRESULT CClientAdminDlg::OnSysCommand(WPARAM wParam, LPARAM) {
-  if ((wParam & 0xFFF0) == IDM_ABOUTBOX)
+void CClientAdminDlg::OnSysCommand(UINT command) {
+  if ((command & 0xFFF0) == IDM_ABOUTBOX)
     ShowAboutBox();
   else
     Default();
-  return 0;
 }
 
 void CClientAdminDlg::ShowAboutBox() {
@@ -208,12 +192,11 @@ void CClientAdminDlg::OnOK() {
   if (Save()) CDialog::OnOK();
 }
 
-LRESULT CClientAdminDlg::OnApply(WPARAM, LPARAM) {
+void CClientAdminDlg::OnApply(UINT, UINT, HWND) {
   if (Save()) EnableItem(IDC_APPLY_NOW, false);
-  return 0;
 }
 
-LRESULT CClientAdminDlg::OnDestroy(WPARAM, LPARAM) {
+LRESULT CClientAdminDlg::OnDestroy() {
   fw::TraceStartup("shutdown: help windows closed");
   KVELLocale::KVEL_HtmlHelp(nullptr, HH_CLOSE_ALL, 0);
   fw::TraceStartup("shutdown: main window destroyed");
@@ -222,22 +205,13 @@ LRESULT CClientAdminDlg::OnDestroy(WPARAM, LPARAM) {
   return 0;
 }
 
-LRESULT CClientAdminDlg::OnPaint(WPARAM, LPARAM) {
+LRESULT CClientAdminDlg::OnPaint() {
   fw::TraceStartup("main window painted");
-  if (!IsIconic(m_hWnd)) {
+  if (IsIconic(m_hWnd))
+    PaintIconic(m_hIcon);
+  else
     Default();
-    return 0;
-  }
-  PAINTSTRUCT paint;
-  HDC dc = BeginPaint(m_hWnd, &paint);
-  SendMessage(WM_ICONERASEBKGND, reinterpret_cast<WPARAM>(dc), 0);
-  RECT client;
-  GetClientRect(m_hWnd, &client);
-  int x = (client.right - client.left - GetSystemMetrics(SM_CXICON) + 1) / 2;
-  int y = (client.bottom - client.top - GetSystemMetrics(SM_CYICON) + 1) / 2;
-  DrawIcon(dc, x, y, m_hIcon);
-  EndPaint(m_hWnd, &paint);
   return 0;
 }
 
-LRESULT CClientAdminDlg::OnQueryDragIcon(WPARAM, LPARAM) { return reinterpret_cast<LRESULT>(m_hIcon); }
+LRESULT CClientAdminDlg::OnQueryDragIcon() { return reinterpret_cast<LRESULT>(m_hIcon); }

@@ -18,8 +18,6 @@ class CClientAdminDlg : public CDialog, public AdminSession {
  public:
   explicit CClientAdminDlg(CWnd* parent = nullptr);
 
-  // Enables the Apply button; offered to the pages.
-  void EnableApply() override;
   void OpenAdvancedSettings() override;
   // The common save of OK and Apply; true when the settings were written.
   bool Save();
@@ -31,13 +29,13 @@ class CClientAdminDlg : public CDialog, public AdminSession {
   const MessageMap* GetMessageMap() const override;
 
  private:
-  LRESULT OnSysCommand(WPARAM wParam, LPARAM lParam);
-  LRESULT OnDestroy(WPARAM wParam, LPARAM lParam);
-  LRESULT OnPaint(WPARAM wParam, LPARAM lParam);
-  LRESULT OnQueryDragIcon(WPARAM wParam, LPARAM lParam);
-  LRESULT OnApply(WPARAM wParam, LPARAM lParam);
-  LRESULT OnTreeSelChanged(WPARAM wParam, LPARAM lParam);
-  LRESULT OnCommandHelp(WPARAM wParam, LPARAM lParam);
+  void OnSysCommand(UINT command);
+  LRESULT OnDestroy();
+  LRESULT OnPaint();
+  LRESULT OnQueryDragIcon();
+  void OnApply(UINT id, UINT code, HWND control);
+  LRESULT OnTreeSelChanged(NMHDR* header);
+  LRESULT OnCommandHelp();
 
   void LoadSettings();
   void BuildPageTree();

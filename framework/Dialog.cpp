@@ -142,6 +142,23 @@ bool CDialog::OnUnhandledMessage(UINT message, WPARAM wParam, LPARAM, LRESULT& r
   return false;
 }
 
+HBRUSH CDialog::DefaultControlColor(UINT message, HDC dc, HWND control) const {
+  return reinterpret_cast<HBRUSH>(
+      DefWindowProcW(m_hWnd, message, reinterpret_cast<WPARAM>(dc), reinterpret_cast<LPARAM>(control)));
+}
+
+void CDialog::PaintIconic(HICON icon) const {
+  PAINTSTRUCT paint;
+  HDC dc = BeginPaint(m_hWnd, &paint);
+  SendMessage(WM_ICONERASEBKGND, reinterpret_cast<WPARAM>(dc), 0);
+  RECT client;
+  GetClientRect(m_hWnd, &client);
+  int x = (client.right - client.left - GetSystemMetrics(SM_CXICON) + 1) / 2;
+  int y = (client.bottom - client.top - GetSystemMetrics(SM_CYICON) + 1) / 2;
+  DrawIcon(dc, x, y, icon);
+  EndPaint(m_hWnd, &paint);
+}
+
 bool CDialog::Dispatch(UINT message, WPARAM wParam, LPARAM lParam, LRESULT& result) {
   UINT id = 0, code = 0;
   if (message == WM_COMMAND) {
@@ -162,7 +179,7 @@ bool CDialog::Dispatch(UINT message, WPARAM wParam, LPARAM lParam, LRESULT& resu
       if (entry.id != 0 && entry.id != id) continue;
       if (matchCode && entry.code != code) continue;
       m_bDefaultRequested = false;
-      result = (this->*entry.handler)(wParam, lParam);
+      result = entry.thunk(*this, wParam, lParam);
       return !m_bDefaultRequested;
     }
   }

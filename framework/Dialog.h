@@ -1,19 +1,24 @@
 // Dialogs built from templates of the current resource module, modal or modeless, with a message
-// map that routes (message, control identifier, notification code) to member handlers.
+// map that routes (message, control identifier, notification code) to member handlers. Handlers
+// take the message's parts already unpacked, so no dialog casts WPARAM or LPARAM:
 //
 //   class CMyDlg : public CDialog {
-//     LRESULT OnApply(WPARAM, LPARAM);
+//     void OnApply(UINT id, UINT code, HWND control);
 //     const MessageMap* GetMessageMap() const override;
 //   };
 //   const MessageMap* CMyDlg::GetMessageMap() const {
-//     static const MessageMapEntry entries[] = {
-//         {WM_COMMAND, 57000, BN_CLICKED, Handler(&CMyDlg::OnApply)}};
+//     static const MessageMapEntry entries[] = {fw::OnCommand<&CMyDlg::OnApply>(57000, BN_CLICKED)};
 //     static const MessageMap map = {CDialog::GetMessageMap(), entries, std::size(entries)};
 //     return &map;
 //   }
 //
-// A handler's result is the message's result (for WM_NOTIFY: the notification's result). An
-// exception that escapes a handler is reported by the application object instead of ending the
+//   fw::OnCommand     void (UINT id, UINT code, HWND control)   WM_COMMAND
+//   fw::OnNotify      LRESULT (NMHDR* header)                   WM_NOTIFY: the notification's result
+//   fw::OnCtlColor    HBRUSH (HDC dc, HWND control)             one WM_CTLCOLOR* message
+//   fw::OnSysCommand  void (UINT command)                       WM_SYSCOMMAND
+//   fw::OnMessage     LRESULT ()                                any message without parameters
+//
+// An exception that escapes a handler is reported by the application object instead of ending the
 // program.
 #pragma once
 
@@ -24,13 +29,15 @@
 #include "framework/Wnd.h"
 
 class CDialog;
-using MessageHandler = LRESULT (CDialog::*)(WPARAM, LPARAM);
+
+// Unpacks the message for one kind of handler and calls it; returns the message's result.
+using MessageThunk = LRESULT (*)(CDialog& dialog, WPARAM wParam, LPARAM lParam);
 
 struct MessageMapEntry {
   UINT message;
   UINT id;    // control identifier (WM_COMMAND, WM_NOTIFY, WM_CTLCOLOR*); 0 matches any
   UINT code;  // notification code (WM_COMMAND, WM_NOTIFY); ignored for other messages
-  MessageHandler handler;
+  MessageThunk thunk;
 };
 
 struct MessageMap {
@@ -39,10 +46,61 @@ struct MessageMap {
   size_t count;
 };
 
-template <class T>
-MessageHandler Handler(LRESULT (T::*handler)(WPARAM, LPARAM)) {
-  return static_cast<MessageHandler>(handler);
+namespace fw {
+namespace detail {
+
+template <class Method>
+struct MethodClass;
+template <class T, class R, class... Args>
+struct MethodClass<R (T::*)(Args...)> {
+  using Type = T;
+};
+template <auto Method>
+using Owner = typename MethodClass<decltype(Method)>::Type;
+
+}  // namespace detail
+
+template <auto Method>
+MessageMapEntry OnCommand(UINT id, UINT code) {
+  return {WM_COMMAND, id, code, [](CDialog& dialog, WPARAM wParam, LPARAM lParam) -> LRESULT {
+            (static_cast<detail::Owner<Method>&>(dialog).*Method)(LOWORD(wParam), HIWORD(wParam),
+                                                                  reinterpret_cast<HWND>(lParam));
+            return 0;
+          }};
 }
+
+template <auto Method>
+MessageMapEntry OnNotify(UINT id, UINT code) {
+  return {WM_NOTIFY, id, code, [](CDialog& dialog, WPARAM, LPARAM lParam) -> LRESULT {
+            return (static_cast<detail::Owner<Method>&>(dialog).*Method)(reinterpret_cast<NMHDR*>(lParam));
+          }};
+}
+
+// message is one of WM_CTLCOLORMSGBOX..WM_CTLCOLORSTATIC.
+template <auto Method>
+MessageMapEntry OnCtlColor(UINT message, UINT id) {
+  return {message, id, 0, [](CDialog& dialog, WPARAM wParam, LPARAM lParam) -> LRESULT {
+            return reinterpret_cast<LRESULT>((static_cast<detail::Owner<Method>&>(dialog).*Method)(
+                reinterpret_cast<HDC>(wParam), reinterpret_cast<HWND>(lParam)));
+          }};
+}
+
+template <auto Method>
+MessageMapEntry OnSysCommand() {
+  return {WM_SYSCOMMAND, 0, 0, [](CDialog& dialog, WPARAM wParam, LPARAM) -> LRESULT {
+            (static_cast<detail::Owner<Method>&>(dialog).*Method)(static_cast<UINT>(wParam));
+            return 0;
+          }};
+}
+
+template <auto Method>
+MessageMapEntry OnMessage(UINT message) {
+  return {message, 0, 0, [](CDialog& dialog, WPARAM, LPARAM) -> LRESULT {
+            return (static_cast<detail::Owner<Method>&>(dialog).*Method)();
+          }};
+}
+
+}  // namespace fw
 
 // Moves data between a dialog's controls and its members.
 class CDataExchange {
@@ -93,6 +151,10 @@ class CDialog : public CWnd {
   virtual bool OnUnhandledMessage(UINT message, WPARAM wParam, LPARAM lParam, LRESULT& result);
   // Called by a handler that wants the system's default processing of its message as well.
   void Default() { m_bDefaultRequested = true; }
+  // The system's colours and brush for a control, as a colour handler starts from them.
+  HBRUSH DefaultControlColor(UINT message, HDC dc, HWND control) const;
+  // Paints icon centred in the client area of a minimised window, over the icon background.
+  void PaintIconic(HICON icon) const;
 
   UINT m_nIDTemplate;
   CWnd* m_pParentWnd;

@@ -76,16 +76,15 @@ BOOL CClientMaporaConfigDlg::OnInitDialog() {
 
 const MessageMap* CClientMaporaConfigDlg::GetMessageMap() const {
   static const MessageMapEntry entries[] = {
-      {WM_COMMAND, IDC_ADVANCED, BN_CLICKED, Handler(&CClientMaporaConfigDlg::OnAdvanced)},
+      fw::OnCommand<&CClientMaporaConfigDlg::OnAdvanced>(IDC_ADVANCED, BN_CLICKED),
   };
   static const MessageMap map = {CDialog::GetMessageMap(), entries, std::size(entries)};
   return &map;
 }
 
-LRESULT CClientMaporaConfigDlg::OnAdvanced(WPARAM, LPARAM) {
+void CClientMaporaConfigDlg::OnAdvanced(UINT, UINT, HWND) {
   fw::TraceStartup("advanced: clicked");
   if (m_pAdminDlg != nullptr) m_pAdminDlg->OpenAdvancedSettings();
-  return 0;
 }
 
 void CClientMaporaConfigDlg::BuildInstallationReport() {

@@ -23,7 +23,7 @@ class CClientMaporaConfigDlg : public CDialog {
   const MessageMap* GetMessageMap() const override;
 
  private:
-  LRESULT OnAdvanced(WPARAM wParam, LPARAM lParam);
+  void OnAdvanced(UINT id, UINT code, HWND control);
   void UpdateAdvancedButton();
 
   CRichEditCtrl m_richEdit;

@@ -37,13 +37,13 @@ void CClientMaporaAdvancedConfigDlg::DoDataExchange(CDataExchange* pDX) {
 const MessageMap* CClientMaporaAdvancedConfigDlg::GetMessageMap() const {
   using Self = CClientMaporaAdvancedConfigDlg;
   static const MessageMapEntry entries[] = {
-      {WM_COMMAND, IDC_LANGUAGE_LIST, CBN_SELCHANGE, Handler(&Self::OnLanguageSelChange)},
-      {WM_COMMAND, IDC_KUEI_CHECK, BN_CLICKED, Handler(&Self::OnKueiClicked)},
-      {WM_COMMAND, IDC_LOCAL_PORTAL, BN_CLICKED, Handler(&Self::OnLocalPortalClicked)},
-      {WM_COMMAND, IDC_MANAGE_PORTALS, BN_CLICKED, Handler(&Self::OnManagePortals)},
-      {WM_NOTIFY, IDC_KUEI_LINK, NM_CLICK, Handler(&Self::OnLearnMore)},
-      {WM_NOTIFY, IDC_KUEI_LINK, NM_RETURN, Handler(&Self::OnLearnMore)},
-      {WM_CTLCOLORSTATIC, IDC_LANGUAGE_WARNING, 0, Handler(&Self::OnCtlColorWarning)},
+      fw::OnCommand<&Self::OnLanguageSelChange>(IDC_LANGUAGE_LIST, CBN_SELCHANGE),
+      fw::OnCommand<&Self::OnKueiClicked>(IDC_KUEI_CHECK, BN_CLICKED),
+      fw::OnCommand<&Self::OnLocalPortalClicked>(IDC_LOCAL_PORTAL, BN_CLICKED),
+      fw::OnCommand<&Self::OnManagePortals>(IDC_MANAGE_PORTALS, BN_CLICKED),
+      fw::OnNotify<&Self::OnLearnMore>(IDC_KUEI_LINK, NM_CLICK),
+      fw::OnNotify<&Self::OnLearnMore>(IDC_KUEI_LINK, NM_RETURN),
+      fw::OnCtlColor<&Self::OnCtlColorWarning>(WM_CTLCOLORSTATIC, IDC_LANGUAGE_WARNING),
   };
   static const MessageMap map = {CDialog::GetMessageMap(), entries, std::size(entries)};
   return &map;
@@ -73,7 +73,7 @@ BOOL CClientMaporaAdvancedConfigDlg::OnInitDialog() {
 
   m_enableKuei = ReadEnableKuei(products);
   CheckItem(IDC_KUEI_CHECK, m_enableKuei != 0);
-  m_supportLocalPortal = ReadSupportLocalPortal();
+  m_supportLocalPortal = ReadSupportLocalPortal(ConnectionKeyAccess::CreateMissing);
   CheckItem(IDC_LOCAL_PORTAL, m_supportLocalPortal != 0);
   fw::TraceStartup("advanced: OnInitDialog done, shown");
   return TRUE;
@@ -122,36 +122,32 @@ void CClientMaporaAdvancedConfigDlg::UpdateLanguageWarning() {
   ShowItem(IDC_LANGUAGE_WARNING, ShowsLanguagePackWarning(m_languagePackFound, m_languageList.GetCurSel()));
 }
 
-LRESULT CClientMaporaAdvancedConfigDlg::OnLanguageSelChange(WPARAM, LPARAM) {
+void CClientMaporaAdvancedConfigDlg::OnLanguageSelChange(UINT, UINT, HWND) {
   const int index = m_languageList.GetCurSel();
   if (index != CB_ERR) m_selectedLangId = static_cast<DWORD>(m_languageList.GetItemData(index));
   UpdateLanguageWarning();
-  return 0;
 }
 
-LRESULT CClientMaporaAdvancedConfigDlg::OnKueiClicked(WPARAM, LPARAM) {
+void CClientMaporaAdvancedConfigDlg::OnKueiClicked(UINT, UINT, HWND) {
   m_enableKuei = IsItemChecked(IDC_KUEI_CHECK) ? 1 : 0;
-  return 0;
 }
 
-LRESULT CClientMaporaAdvancedConfigDlg::OnLocalPortalClicked(WPARAM, LPARAM) {
+void CClientMaporaAdvancedConfigDlg::OnLocalPortalClicked(UINT, UINT, HWND) {
   m_supportLocalPortal = IsItemChecked(IDC_LOCAL_PORTAL) ? 1 : 0;
-  return 0;
 }
 
-LRESULT CClientMaporaAdvancedConfigDlg::OnLearnMore(WPARAM, LPARAM) {
+LRESULT CClientMaporaAdvancedConfigDlg::OnLearnMore(NMHDR*) {
   ShellExecuteW(m_hWnd, L"open", LearnMoreAddress().c_str(), nullptr, nullptr, SW_SHOWNORMAL);
   return 0;
 }
 
-LRESULT CClientMaporaAdvancedConfigDlg::OnManagePortals(WPARAM, LPARAM) {
+void CClientMaporaAdvancedConfigDlg::OnManagePortals(UINT, UINT, HWND) {
   OpenPortalConnectionManager();
-  return 0;
 }
 
-LRESULT CClientMaporaAdvancedConfigDlg::OnCtlColorWarning(WPARAM wParam, LPARAM lParam) {
+HBRUSH CClientMaporaAdvancedConfigDlg::OnCtlColorWarning(HDC dc, HWND control) {
   // The system's colours and brush first, then only the text turns red.
-  LRESULT brush = DefWindowProcW(m_hWnd, WM_CTLCOLORSTATIC, wParam, lParam);
-  SetTextColor(reinterpret_cast<HDC>(wParam), RGB(255, 0, 0));
+  HBRUSH brush = DefaultControlColor(WM_CTLCOLORSTATIC, dc, control);
+  SetTextColor(dc, RGB(255, 0, 0));
   return brush;
 }

@@ -39,12 +39,12 @@ class CClientMaporaAdvancedConfigDlg : public CDialog {
   void BuildLanguageList();
   void UpdateLanguageWarning();
 
-  LRESULT OnLanguageSelChange(WPARAM wParam, LPARAM lParam);
-  LRESULT OnKueiClicked(WPARAM wParam, LPARAM lParam);
-  LRESULT OnLocalPortalClicked(WPARAM wParam, LPARAM lParam);
-  LRESULT OnLearnMore(WPARAM wParam, LPARAM lParam);
-  LRESULT OnManagePortals(WPARAM wParam, LPARAM lParam);
-  LRESULT OnCtlColorWarning(WPARAM wParam, LPARAM lParam);
+  void OnLanguageSelChange(UINT id, UINT code, HWND control);
+  void OnKueiClicked(UINT id, UINT code, HWND control);
+  void OnLocalPortalClicked(UINT id, UINT code, HWND control);
+  LRESULT OnLearnMore(NMHDR* header);
+  void OnManagePortals(UINT id, UINT code, HWND control);
+  HBRUSH OnCtlColorWarning(HDC dc, HWND control);
 
   CComboBox m_languageList;
 };
