@@ -10,18 +10,6 @@
 #include "framework/ScopedHandle.h"
 #include "framework/Wnd.h"
 
-namespace fw {
-
-struct ImageListTraits {
-  using Handle = HIMAGELIST;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ImageList_Destroy(handle); }
-};
-using ScopedImageList = UniqueHandle<ImageListTraits>;
-
-}  // namespace fw
-
 class CComboBox : public CWnd {
  public:
   void ResetContent() const { SendMessage(CB_RESETCONTENT); }

@@ -29,7 +29,7 @@ HBITMAP LoadPngBitmap(UINT id, COLORREF background) {
   ComRef<IStream> stream;
   if (FAILED(CreateStreamOnHGlobal(copy.Get(), TRUE, stream.Receive()))) return nullptr;
   // The stream frees the memory from here on.
-  copy.Release();
+  copy.Take();
   return DecodeBitmap(stream.Get(), background);
 }
 

@@ -60,7 +60,7 @@ LONG RegistryKey::Create(HKEY root, const wchar_t* path, REGSAM access) {
   return Adopt(status, key, root);
 }
 
-LONG RegistryKey::ReadString(const wchar_t* name, std::wstring& out) const {
+LONG RegistryKey::ReadText(const wchar_t* name, std::wstring& out, DWORD& type) const {
   if (key_ == nullptr) return ERROR_INVALID_HANDLE;
   DWORD size = 0;
   LONG status = ::RegQueryValueExW(key_, name, nullptr, nullptr, nullptr, &size);
@@ -71,7 +71,7 @@ LONG RegistryKey::ReadString(const wchar_t* name, std::wstring& out) const {
     // the value carries no terminator of its own.
     buffer.assign(size / sizeof(wchar_t) + 2, L'\0');
     DWORD read = size;
-    status = ::RegQueryValueExW(key_, name, nullptr, nullptr, reinterpret_cast<BYTE*>(buffer.data()), &read);
+    status = ::RegQueryValueExW(key_, name, nullptr, &type, reinterpret_cast<BYTE*>(buffer.data()), &read);
     if (status == ERROR_SUCCESS) {
       out.assign(buffer.data(), wcsnlen(buffer.data(), buffer.size()));
       return status;
@@ -82,7 +82,40 @@ LONG RegistryKey::ReadString(const wchar_t* name, std::wstring& out) const {
   return status == ERROR_SUCCESS ? ERROR_MORE_DATA : status;
 }
 
+LONG RegistryKey::ReadString(const wchar_t* name, std::wstring& out, DWORD* type) const {
+  std::wstring text;
+  DWORD found = REG_NONE;
+  const LONG status = ReadText(name, text, found);
+  if (status != ERROR_SUCCESS) return status;
+  if (found != REG_SZ && found != REG_EXPAND_SZ) return ERROR_UNSUPPORTED_TYPE;
+  out = std::move(text);
+  if (type != nullptr) *type = found;
+  return status;
+}
+
+LONG RegistryKey::ReadAnyValueAsText(const wchar_t* name, std::wstring& out) const {
+  DWORD type = REG_NONE;
+  return ReadText(name, out, type);
+}
+
 LONG RegistryKey::ReadDword(const wchar_t* name, DWORD& out) const {
+  if (key_ == nullptr) return ERROR_INVALID_HANDLE;
+  DWORD type = REG_NONE;
+  DWORD size = 0;
+  LONG status = ::RegQueryValueExW(key_, name, nullptr, &type, nullptr, &size);
+  if (status != ERROR_SUCCESS) return status;
+  if (type != REG_DWORD) return ERROR_UNSUPPORTED_TYPE;
+  if (size != sizeof(DWORD)) return ERROR_INVALID_DATA;
+  DWORD value = 0;
+  status = ::RegQueryValueExW(key_, name, nullptr, &type, reinterpret_cast<BYTE*>(&value), &size);
+  if (status != ERROR_SUCCESS) return status;
+  // Changed between the two queries.
+  if (type != REG_DWORD || size != sizeof(DWORD)) return ERROR_INVALID_DATA;
+  out = value;
+  return status;
+}
+
+LONG RegistryKey::ReadUpTo4BytesOverDword(const wchar_t* name, DWORD& out) const {
   DWORD value = out;
   DWORD size = sizeof value;
   LONG status = ReadBytes(name, &value, size);
@@ -93,6 +126,17 @@ LONG RegistryKey::ReadDword(const wchar_t* name, DWORD& out) const {
 LONG RegistryKey::ReadBytes(const wchar_t* name, void* data, DWORD& size) const {
   if (key_ == nullptr) return ERROR_INVALID_HANDLE;
   return ::RegQueryValueExW(key_, name, nullptr, nullptr, static_cast<BYTE*>(data), &size);
+}
+
+LONG RegistryKey::CountChildren(DWORD& subkeys, DWORD& values) const {
+  if (key_ == nullptr) return ERROR_INVALID_HANDLE;
+  return ::RegQueryInfoKeyW(key_, nullptr, nullptr, nullptr, &subkeys, nullptr, nullptr, &values, nullptr, nullptr,
+                            nullptr, nullptr);
+}
+
+LONG RegistryKey::DeleteSubKey(const wchar_t* path) const {
+  if (key_ == nullptr) return ERROR_INVALID_HANDLE;
+  return ::RegDeleteKeyW(key_, path);
 }
 
 LONG RegistryKey::WriteDword(const wchar_t* name, DWORD value) const {
@@ -110,7 +154,7 @@ LONG RegistryKey::DeleteValue(const wchar_t* name) const {
 DWORD ReadRegistryDword(HKEY root, const std::wstring& keyPath, const std::wstring& valueName, DWORD defaultValue) {
   fw::RegistryKey key;
   DWORD value = defaultValue;
-  if (key.Open(root, keyPath.c_str()) == ERROR_SUCCESS) key.ReadDword(valueName.c_str(), value);
+  if (key.Open(root, keyPath.c_str()) == ERROR_SUCCESS) key.ReadUpTo4BytesOverDword(valueName.c_str(), value);
   return value;
 }
 

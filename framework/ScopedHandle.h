@@ -4,6 +4,10 @@
 #pragma once
 
 #include <windows.h>
+#include <commctrl.h>
+#include <objbase.h>
+#include <oleauto.h>
+#include <shtypes.h>
 
 namespace fw {
 
@@ -16,9 +20,9 @@ class UniqueHandle {
   UniqueHandle() = default;
   explicit UniqueHandle(Handle handle) : handle_(handle) {}
   ~UniqueHandle() { Reset(); }
-  UniqueHandle(UniqueHandle&& other) noexcept : handle_(other.Release()) {}
+  UniqueHandle(UniqueHandle&& other) noexcept : handle_(other.Take()) {}
   UniqueHandle& operator=(UniqueHandle&& other) noexcept {
-    if (this != &other) Reset(other.Release());
+    if (this != &other) Reset(other.Take());
     return *this;
   }
   UniqueHandle(const UniqueHandle&) = delete;
@@ -35,7 +39,7 @@ class UniqueHandle {
     if (Traits::IsValid(old)) Traits::Close(old);
   }
   // Gives the handle up without closing it.
-  Handle Release() {
+  Handle Take() {
     Handle handle = handle_;
     handle_ = Traits::Invalid();
     return handle;
@@ -108,5 +112,32 @@ struct LibraryTraits {
   static void Close(Handle handle) { ::FreeLibrary(handle); }
 };
 using ScopedLibrary = UniqueHandle<LibraryTraits>;
+
+// Image lists of the common controls.
+struct ImageListTraits {
+  using Handle = HIMAGELIST;
+  static Handle Invalid() { return nullptr; }
+  static bool IsValid(Handle handle) { return handle != nullptr; }
+  static void Close(Handle handle) { ImageList_Destroy(handle); }
+};
+using ScopedImageList = UniqueHandle<ImageListTraits>;
+
+// Texts a COM call hands out as BSTR.
+struct BstrTraits {
+  using Handle = BSTR;
+  static Handle Invalid() { return nullptr; }
+  static bool IsValid(Handle handle) { return handle != nullptr; }
+  static void Close(Handle handle) { ::SysFreeString(handle); }
+};
+using ScopedBstr = UniqueHandle<BstrTraits>;
+
+// Shell item lists (PIDLs), which belong to the shell's allocator, the COM task allocator.
+struct ItemListTraits {
+  using Handle = PIDLIST_ABSOLUTE;
+  static Handle Invalid() { return nullptr; }
+  static bool IsValid(Handle handle) { return handle != nullptr; }
+  static void Close(Handle handle) { ::CoTaskMemFree(handle); }
+};
+using ScopedItemList = UniqueHandle<ItemListTraits>;
 
 }  // namespace fw

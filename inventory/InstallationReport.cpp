@@ -2,7 +2,7 @@
 
 #include <shlobj.h>
 
-#include "framework/ComRef.h"
+#include "framework/ScopedHandle.h"
 #include "framework/Strings.h"
 #include "res/resource.h"
 
@@ -45,14 +45,11 @@ std::wstring CurrentUserName() {
 }
 
 std::wstring RoamingAppDataFolder() {
-  LPITEMIDLIST itemList = nullptr;
-  if (FAILED(SHGetSpecialFolderLocation(nullptr, CSIDL_APPDATA, &itemList)) || itemList == nullptr)
+  fw::ScopedItemList itemList;
+  if (FAILED(SHGetSpecialFolderLocation(nullptr, CSIDL_APPDATA, itemList.Receive())) || !itemList)
     return std::wstring();
   wchar_t path[kPathChars] = L"";
-  if (!SHGetPathFromIDListW(itemList, path)) path[0] = L'\0';
-  // The item list belongs to the shell's allocator.
-  ComRef<IMalloc> shellAllocator;
-  if (SUCCEEDED(SHGetMalloc(shellAllocator.Receive())) && shellAllocator) shellAllocator->Free(itemList);
+  if (!SHGetPathFromIDListW(itemList.Get(), path)) path[0] = L'\0';
   return path;
 }
 

@@ -6,6 +6,7 @@
 #include <cwchar>
 
 #include "framework/RegistryKey.h"
+#include "framework/ScopedHandle.h"
 #include "framework/SystemLibrary.h"
 #include "inventory/ProductRegistry.h"
 
@@ -19,11 +20,8 @@ bool IsMarkerSet(const std::wstring& name) {
   return GetEnvironmentVariableW(name.c_str(), value, kMarkerBufferChars) != 0;
 }
 
-std::wstring TakeBstr(BSTR& text) {
-  std::wstring result = text ? std::wstring(text, SysStringLen(text)) : std::wstring();
-  SysFreeString(text);
-  text = nullptr;
-  return result;
+std::wstring BstrText(const fw::ScopedBstr& text) {
+  return text ? std::wstring(text.Get(), SysStringLen(text.Get())) : std::wstring();
 }
 
 // Every item from the start of the list; a failing Next ends the list like its end does.
@@ -32,13 +30,11 @@ std::vector<SuiteRuntime> ReadRuntimes(ISuiteRuntimeEnumerator* enumerator) {
   if (enumerator == nullptr || FAILED(enumerator->Reset())) return runtimes;
   for (;;) {
     long code = 0;
-    BSTR version = nullptr;
-    BSTR detail = nullptr;
-    HRESULT hr = enumerator->Next(&code, &version, &detail);
-    std::wstring versionText = TakeBstr(version);
-    TakeBstr(detail);
+    fw::ScopedBstr version;
+    fw::ScopedBstr detail;
+    HRESULT hr = enumerator->Next(&code, version.Receive(), detail.Receive());
     if (hr != S_OK) return runtimes;
-    runtimes.push_back({code, versionText});
+    runtimes.push_back({code, BstrText(version)});
   }
 }
 
@@ -70,7 +66,7 @@ std::wstring ReadRegistryString(HKEY hive, const std::wstring& subkey, const std
   else
     opened = key.Open(hive, subkey.c_str());
   std::wstring result = defaultText;
-  if (opened == ERROR_SUCCESS) key.ReadString(valueName.c_str(), result);
+  if (opened == ERROR_SUCCESS) key.ReadAnyValueAsText(valueName.c_str(), result);
   return result;
 }
 

@@ -23,19 +23,17 @@ HMODULE LoadRegisteredControl() {
   if (key.Open(HKEY_CLASSES_ROOT, L"CLSID\\{ADB880A6-D8FF-11CF-9377-00AA003B7A11}\\InprocServer32",
                KEY_QUERY_VALUE) != ERROR_SUCCESS)
     return nullptr;
-  wchar_t path[MAX_PATH + 1] = {};
-  DWORD type = 0;
-  DWORD size = MAX_PATH * sizeof(wchar_t);  // leaves room for a terminator the data may lack
-  if (RegQueryValueExW(key.Get(), nullptr, nullptr, &type, reinterpret_cast<BYTE*>(path), &size) != ERROR_SUCCESS ||
-      (type != REG_SZ && type != REG_EXPAND_SZ))
-    return nullptr;
+  std::wstring path;
+  DWORD type = REG_NONE;
+  // A path longer than the system's limit could never load.
+  if (key.ReadString(nullptr, path, &type) != ERROR_SUCCESS || path.size() >= MAX_PATH) return nullptr;
   if (type == REG_EXPAND_SZ) {
     wchar_t expanded[MAX_PATH];
-    DWORD length = ExpandEnvironmentStringsW(path, expanded, MAX_PATH);
+    DWORD length = ExpandEnvironmentStringsW(path.c_str(), expanded, MAX_PATH);
     if (length == 0 || length > MAX_PATH) return nullptr;
     return LoadLibraryW(expanded);
   }
-  return LoadLibraryW(path);
+  return LoadLibraryW(path.c_str());
 }
 
 // The system's own copy, by name but only from the system folder: a file of that name beside
@@ -54,7 +52,7 @@ bool Adopt(fw::ScopedLibrary control) {
   if (!control) return false;
   g_htmlHelp = FindEntry(control.Get());
   if (!g_htmlHelp) return false;
-  control.Release();
+  control.Take();
   return true;
 }
 

@@ -21,11 +21,18 @@ LONG ClassesKeyStatus(const std::wstring& path) {
   return key.Open(HKEY_CLASSES_ROOT, path.c_str());
 }
 
+// Deletes a key under HKEY_CLASSES_ROOT that has no subkeys.
+LONG DeleteClassesKey(const std::wstring& path) {
+  fw::RegistryKey root;
+  root.Open(HKEY_CLASSES_ROOT, L"");
+  return root.DeleteSubKey(path.c_str());
+}
+
 // Two rounds of create-or-delete leave the probe key as they found it.
 bool ProbeMachineWrite() {
   for (int round = 0; round < 2; ++round) {
     if (ClassesKeyStatus(kMachineWriteProbeKey) == ERROR_SUCCESS) {
-      if (RegDeleteKeyW(HKEY_CLASSES_ROOT, kMachineWriteProbeKey.c_str()) != ERROR_SUCCESS) return false;
+      if (DeleteClassesKey(kMachineWriteProbeKey) != ERROR_SUCCESS) return false;
     } else {
       fw::RegistryKey created;
       if (created.Create(HKEY_CLASSES_ROOT, kMachineWriteProbeKey.c_str()) != ERROR_SUCCESS) return false;
@@ -49,10 +56,9 @@ void DeleteEmptyClassesKey(const std::wstring& path) {
   if (key.Open(HKEY_CLASSES_ROOT, path.c_str(), KEY_QUERY_VALUE) != ERROR_SUCCESS) return;
   DWORD subkeys = 0;
   DWORD values = 0;
-  const LONG status = RegQueryInfoKeyW(key.Get(), nullptr, nullptr, nullptr, &subkeys, nullptr, nullptr, &values,
-                                       nullptr, nullptr, nullptr, nullptr);
+  const LONG status = key.CountChildren(subkeys, values);
   key.Close();
-  if (status == ERROR_SUCCESS && subkeys == 0 && values == 0) RegDeleteKeyW(HKEY_CLASSES_ROOT, path.c_str());
+  if (status == ERROR_SUCCESS && subkeys == 0 && values == 0) DeleteClassesKey(path);
 }
 
 }  // namespace
