@@ -8,13 +8,6 @@
 #include "locale/KVELLocale.h"
 #include "res/resource.h"
 
-namespace {
-
-// A remote server may keep an outgoing call waiting this long before the call gives up.
-constexpr DWORD kMessagePendingDelayMs = 45000;
-
-}  // namespace
-
 BOOL CClientAdminApp::InitInstance() {
   fw::TraceStartup("process entry, command line");
   CMDACommandLineInfo commandLine;
@@ -35,7 +28,6 @@ BOOL CClientAdminApp::InitInstance() {
     AfxMessageBox(IDS_OLE_INIT_FAILED, MB_OK);
     return FALSE;
   }
-  SetMessagePendingDelay(kMessagePendingDelayMs);
   fw::TraceStartup("rich edit library");
   InitRichEdit();
   fw::TraceStartup("common controls");

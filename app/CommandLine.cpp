@@ -16,7 +16,7 @@ bool EqualsIgnoringAsciiCase(const wchar_t* text, const wchar_t* name) {
 
 }  // namespace
 
-void CMDACommandLineInfo::ParseParam(const wchar_t* param, BOOL isFlag, BOOL isLast) {
+void CMDACommandLineInfo::ParseParam(const wchar_t* param, BOOL isFlag, BOOL) {
   if (param == nullptr) param = L"";
   if (isFlag) {
     if (!EqualsIgnoringAsciiCase(param, L"Lang")) {
@@ -32,7 +32,6 @@ void CMDACommandLineInfo::ParseParam(const wchar_t* param, BOOL isFlag, BOOL isL
     // The state stays "expect Lang", so a later plain argument overwrites this one.
     m_strLang = param;
   }
-  ParseLast(isLast);
 }
 
 bool CMDACommandLineInfo::LanguageOverride(unsigned short& langId) const {

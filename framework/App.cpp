@@ -13,15 +13,7 @@ CWinApp* g_app = nullptr;
 
 // The description the system has for an HRESULT, in the user's language.
 CString DescribeError(HRESULT hr) {
-  fw::ScopedLocalMemory<wchar_t> text;
-  DWORD length = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER |
-                                    FORMAT_MESSAGE_IGNORE_INSERTS,
-                                nullptr, static_cast<DWORD>(hr), 0, reinterpret_cast<LPWSTR>(text.Receive()), 0,
-                                nullptr);
-  CString description;
-  if (length > 0 && text) description.assign(text.Get(), length);
-  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
-    description.pop_back();
+  const CString description = fw::SystemErrorText(static_cast<DWORD>(hr));
   CString code = fw::Format(L"0x%08lX", static_cast<unsigned long>(hr));
   return description.empty() ? code : description + L" (" + code + L")";
 }
@@ -30,8 +22,6 @@ CString DescribeError(HRESULT hr) {
 // while the user interface goes on painting.
 class MessageFilter final : public IMessageFilter {
  public:
-  DWORD m_pendingDelay = 8000;
-
   HRESULT STDMETHODCALLTYPE QueryInterface(REFIID iid, void** out) override {
     if (out == nullptr) return E_POINTER;
     if (IsEqualIID(iid, IID_IUnknown) || IsEqualIID(iid, IID_IMessageFilter)) {
@@ -72,18 +62,13 @@ class CWinApp::OleSession {
     CoRegisterMessageFilter(nullptr, nullptr);
     OleUninitialize();
   }
-  MessageFilter& Filter() { return filter_; }
 
  private:
   MessageFilter filter_;
   bool initialized_ = false;
 };
 
-void CCommandLineInfo::ParseParam(const wchar_t*, BOOL, BOOL isLast) { ParseLast(isLast); }
-
-void CCommandLineInfo::ParseLast(BOOL isLast) {
-  if (isLast) m_bParsedAll = true;
-}
+void CCommandLineInfo::ParseParam(const wchar_t*, BOOL, BOOL) {}
 
 CWinApp::CWinApp() { g_app = this; }
 
@@ -143,14 +128,8 @@ void WalkCommandLine(CCommandLineInfo& info, int argc, const wchar_t* const* arg
 bool CWinApp::InitOle() {
   auto session = std::make_unique<OleSession>();
   if (!session->Start()) return false;
-  session->Filter().m_pendingDelay = m_pendingDelay;
   m_ole = std::move(session);
   return true;
-}
-
-void CWinApp::SetMessagePendingDelay(DWORD milliseconds) {
-  m_pendingDelay = milliseconds;
-  if (m_ole) m_ole->Filter().m_pendingDelay = milliseconds;
 }
 
 void CWinApp::InitCommonControls(DWORD classes) {

@@ -20,12 +20,8 @@ class CCommandLineInfo {
  public:
   virtual ~CCommandLineInfo() = default;
   // isFlag: the argument began with '-' or '/', which has been removed.
+  // Plain arguments are never taken as a document to open.
   virtual void ParseParam(const wchar_t* param, BOOL isFlag, BOOL isLast);
-
- protected:
-  // End-of-line handling; plain arguments are never taken as a document to open.
-  void ParseLast(BOOL isLast);
-  bool m_bParsedAll = false;
 };
 
 // Hands arguments 1..argc-1 of argv to info in order. An argument that starts with '-' or '/' is
@@ -63,11 +59,6 @@ class CWinApp {
   void ParseCommandLine(CCommandLineInfo& info);
   // Initialises OLE and installs the application's message filter; false on failure.
   bool InitOle();
-  // The delay after which a pending outgoing call would count as unanswered. The framework shows
-  // no "server busy" or "server not responding" dialog, so such a call simply goes on waiting
-  // (messages keep being processed) and a rejected one is retried: the delay is recorded but
-  // changes nothing a user sees.
-  void SetMessagePendingDelay(DWORD milliseconds);
   // Registers the common-control classes (ICC_* flags) that are not registered yet.
   void InitCommonControls(DWORD classes);
   // Loads the rich edit library; false when it cannot be loaded.
@@ -87,7 +78,6 @@ class CWinApp {
   CString m_helpFilePath;
   class OleSession;
   std::unique_ptr<OleSession> m_ole;
-  DWORD m_pendingDelay = 8000;
   DWORD m_commonControls = 0;
 };
 

@@ -22,11 +22,13 @@ bool RevertToBuiltInResources() {
   return true;
 }
 
-CString LoadString(UINT id) {
+CString LoadString(UINT id) { return LoadStringFrom(GetResourceHandle(), id); }
+
+CString LoadStringFrom(HINSTANCE module, UINT id) {
   // With a zero length LoadStringW hands out a pointer into the resource itself, which is not
   // zero-terminated; the returned length is what counts.
   const wchar_t* text = nullptr;
-  int length = LoadStringW(GetResourceHandle(), id, reinterpret_cast<LPWSTR>(&text), 0);
+  int length = module != nullptr ? LoadStringW(module, id, reinterpret_cast<LPWSTR>(&text), 0) : 0;
   if (length <= 0 || text == nullptr) return CString();
   return CString(text, static_cast<size_t>(length));
 }
@@ -87,6 +89,31 @@ CString ToUpper(const CString& text) {
   CString upper = text;
   if (!upper.empty()) CharUpperBuffW(&upper[0], static_cast<DWORD>(upper.size()));
   return upper;
+}
+
+CString SystemErrorText(DWORD code) {
+  ScopedLocalMemory<wchar_t> text;
+  const DWORD length =
+      FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_IGNORE_INSERTS,
+                     nullptr, code, 0, reinterpret_cast<LPWSTR>(text.Receive()), 0, nullptr);
+  CString description;
+  if (length > 0 && text) description.assign(text.Get(), length);
+  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
+    description.pop_back();
+  return description;
+}
+
+CString ComputerName() {
+  std::vector<wchar_t> name(MAX_COMPUTERNAME_LENGTH + 1);
+  DWORD size = static_cast<DWORD>(name.size());
+  if (!GetComputerNameW(name.data(), &size)) {
+    // Longer names than NetBIOS allows exist; size now holds what the name needs.
+    if (GetLastError() != ERROR_BUFFER_OVERFLOW) return CString();
+    name.resize(size + 1);
+    size = static_cast<DWORD>(name.size());
+    if (!GetComputerNameW(name.data(), &size)) return CString();
+  }
+  return CString(name.data(), size);
 }
 
 }  // namespace fw

@@ -22,6 +22,8 @@ bool RevertToBuiltInResources();
 
 // String-table entry id of the current resource module; empty when it has none.
 CString LoadString(UINT id);
+// String-table entry id of module; empty when it has none.
+CString LoadStringFrom(HINSTANCE module, UINT id);
 // printf-style formatting of a wide format ("%s" takes a wide string, as on Windows).
 CString FormatV(const wchar_t* format, va_list args);
 CString Format(const wchar_t* format, ...);
@@ -34,5 +36,11 @@ CString FormatMessageString(UINT id, const std::vector<CString>& inserts);
 CString FormatMessageText(const CString& format, const std::vector<CString>& inserts);
 
 CString ToUpper(const CString& text);
+
+// The system's description of a Win32 error code or HRESULT, in the user's language and without
+// its trailing line break; empty when the system has none.
+CString SystemErrorText(DWORD code);
+// The computer's name, also one longer than NetBIOS allows; empty when it cannot be had.
+CString ComputerName();
 
 }  // namespace fw

@@ -16,8 +16,6 @@ class AdminSession {
   // Whether machine-wide settings may be changed in this run.
   bool m_machineSettingsWritable = false;
 
-  // Enables the main window's Apply button.
-  virtual void EnableApply() = 0;
   // Runs the advanced settings (the workstation page's "Advanced..." button).
   virtual void OpenAdvancedSettings() = 0;
 

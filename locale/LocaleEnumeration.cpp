@@ -3,12 +3,12 @@
 #include "locale/LocaleNameCatalog.h"
 
 #include <cwchar>
+#include <utility>
+#include <vector>
 
 namespace KVELLocale {
 
 namespace {
-
-LocaleState& s = g_localeState;
 
 // The LANGID of one entry of the system's enumeration; false for an entry that ends it (no
 // hexadecimal number, or one whose LANGID is 0).
@@ -19,80 +19,93 @@ bool ParseLocaleString(const wchar_t* localeString, LANGID& id) {
   return id != 0;
 }
 
-bool ReadLocaleText(LANGID id, LCTYPE type, std::wstring& text) {
-  wchar_t buffer[kLocaleNameChars];
-  if (GetLocaleInfoW(id, type, buffer, kLocaleNameChars) <= 0) return false;
-  text = buffer;
-  return true;
-}
+struct LocaleWalk {
+  LocaleVisitor visit;
+  void* context;
+};
 
-BOOL MatchByIdentifier(LANGID id) {
-  // Any supported locale of the same primary language makes the target usable.
-  if (PRIMARYLANGID(id) != s.enumLangId) return TRUE;
-  s.enumFound = true;
-  return FALSE;
-}
+// The walk in progress on this thread: the enumeration's callback takes no context of its own.
+thread_local LocaleWalk* t_walk = nullptr;
 
-BOOL MatchByName(LANGID id) {
-  if (!s.enumName) return FALSE;
-  LocaleIsoNames names;
-  LANGID named = 0;
-  if (!ReadLocaleIsoNames(id, names) || !MatchFolderName(s.enumName, names, named)) return TRUE;
-  s.enumFound = true;
-  s.enumLangId = PRIMARYLANGID(named);
-  s.enumCountryId = SUBLANGID(named);
-  return FALSE;
-}
-
-void Enumerate(unsigned short langId, unsigned short countryId, const wchar_t* name) {
-  s.enumFound = false;
-  s.enumLangId = langId;
-  s.enumCountryId = countryId;
-  s.enumName = name;
-  EnumSystemLocalesW(EnumLocalesProc, LCID_SUPPORTED);
-  s.enumName = nullptr;  // the caller's text does not outlive the call
-}
-
-// The catalog being filled by FromSystem; the enumeration's callback takes no context.
-std::vector<LocaleIsoNames>* g_catalogBeingRead = nullptr;
-
-BOOL CALLBACK AddToCatalog(LPWSTR localeString) {
+BOOL CALLBACK VisitLocale(LPWSTR localeString) {
   LANGID id = 0;
   if (!ParseLocaleString(localeString, id)) return FALSE;
-  LocaleIsoNames names;
-  if (ReadLocaleIsoNames(id, names)) g_catalogBeingRead->push_back(std::move(names));
-  return TRUE;
+  return t_walk->visit(id, t_walk->context) ? TRUE : FALSE;
 }
+
+struct NameSearch {
+  const wchar_t* name;
+  bool found = false;
+  LANGID langId = 0;
+};
 
 }  // namespace
 
-BOOL CALLBACK EnumLocalesProc(LPWSTR localeString) {
-  LANGID id = 0;
-  if (!ParseLocaleString(localeString, id)) return FALSE;
-  return s.enumLangId != 0 ? MatchByIdentifier(id) : MatchByName(id);
+void WalkSupportedLocales(LocaleVisitor visit, void* context) {
+  LocaleWalk walk = {visit, context};
+  LocaleWalk* outer = std::exchange(t_walk, &walk);
+  EnumSystemLocalesW(VisitLocale, LCID_SUPPORTED);
+  t_walk = outer;
+}
+
+bool ReadLocaleInfo(LCID locale, LCTYPE type, int capacity, std::wstring& data) {
+  std::vector<wchar_t> buffer(static_cast<size_t>(capacity), L'\0');
+  const int written = GetLocaleInfoW(locale, type, buffer.data(), capacity);
+  if (written <= 0) return false;
+  data.assign(buffer.data(), static_cast<size_t>(written));
+  return true;
+}
+
+bool ReadLocaleText(LCID locale, LCTYPE type, int capacity, std::wstring& text) {
+  std::wstring data;
+  if (!ReadLocaleInfo(locale, type, capacity, data)) return false;
+  text.assign(data.c_str());
+  return true;
 }
 
 bool IsValidLangID(unsigned short langId) {
-  if (langId == 0) return false;
-  // A primary language of 0 selects name mode with no name, which never matches.
-  Enumerate(PRIMARYLANGID(langId), SUBLANGID(langId), nullptr);
-  return s.enumFound;
+  // A primary language of 0 is no language at all.
+  WORD primary = PRIMARYLANGID(langId);
+  if (primary == 0) return false;
+  bool found = false;
+  struct Search {
+    WORD primary;
+    bool* found;
+  } search = {primary, &found};
+  // Any supported locale of the same primary language makes the target usable.
+  WalkSupportedLocales(
+      [](LANGID id, void* context) {
+        auto* target = static_cast<Search*>(context);
+        if (PRIMARYLANGID(id) != target->primary) return true;
+        *target->found = true;
+        return false;
+      },
+      &search);
+  return found;
 }
 
 bool GetLangIDFromName(const wchar_t* name, unsigned short& langId) {
   langId = 0;
   if (!name) return false;
-  Enumerate(0, 0, name);
-  if (s.enumFound) langId = MAKELANGID(s.enumLangId, s.enumCountryId);
-  return s.enumFound;
+  NameSearch search = {name};
+  WalkSupportedLocales(
+      [](LANGID id, void* context) {
+        auto* target = static_cast<NameSearch*>(context);
+        LocaleIsoNames names;
+        target->found = ReadLocaleIsoNames(id, names) && MatchFolderName(target->name, names, target->langId);
+        return !target->found;
+      },
+      &search);
+  langId = search.langId;
+  return search.found;
 }
 
 bool ReadLocaleIsoNames(LANGID langId, LocaleIsoNames& names) {
   names = LocaleIsoNames();
   names.langId = langId;
-  if (!ReadLocaleText(langId, LOCALE_SISO639LANGNAME, names.language)) return false;
+  if (!ReadLocaleText(langId, LOCALE_SISO639LANGNAME, kLocaleNameChars, names.language)) return false;
   std::wstring country;
-  if (ReadLocaleText(langId, LOCALE_SISO3166CTRYNAME, country))
+  if (ReadLocaleText(langId, LOCALE_SISO3166CTRYNAME, kLocaleNameChars, country))
     names.languageAndCountry = names.language + L"-" + country;
   return true;
 }
@@ -109,9 +122,13 @@ bool MatchFolderName(const wchar_t* folderName, const LocaleIsoNames& locale, LA
 
 LocaleNameCatalog LocaleNameCatalog::FromSystem() {
   std::vector<LocaleIsoNames> locales;
-  g_catalogBeingRead = &locales;
-  EnumSystemLocalesW(AddToCatalog, LCID_SUPPORTED);
-  g_catalogBeingRead = nullptr;
+  WalkSupportedLocales(
+      [](LANGID id, void* context) {
+        LocaleIsoNames names;
+        if (ReadLocaleIsoNames(id, names)) static_cast<std::vector<LocaleIsoNames>*>(context)->push_back(std::move(names));
+        return true;
+      },
+      &locales);
   return LocaleNameCatalog(std::move(locales));
 }
 

@@ -30,10 +30,6 @@ struct LocaleState {
   bool overridePending;
   bool rtlLanguageKnown, rtlLanguage;
   bool rtlKnown, rtl;
-  // Scratch of the locale enumeration: a non-zero enumLangId selects by-identifier mode.
-  bool enumFound;
-  unsigned short enumLangId, enumCountryId;
-  const wchar_t* enumName;  // not owned; only valid during one enumeration
 };
 
 extern LocaleState g_localeState;
@@ -46,10 +42,10 @@ void InitUILocale();
 LANGID DetermineUILangID();
 // The stored UI language choice (UILANGID, or Q4-UILANGID for q4.exe); 0 when there is none.
 LANGID ReadStoredUILangID();
-// True when some supported system locale shares the primary language of langId. Not re-entrant.
+// True when some supported system locale shares the primary language of langId.
 bool IsValidLangID(unsigned short langId);
-// Maps a language-pack folder name ("de" -> 0x0007, "de-DE" -> 0x0407) to a LANGID.
-// langId is 0 unless a supported locale matches. Not re-entrant.
+// Maps a language-pack folder name ("de" -> 0x0007, "de-DE" -> 0x0407) to a LANGID: the first
+// supported locale in the system's order that the name names. langId is 0 unless one does.
 bool GetLangIDFromName(const wchar_t* name, unsigned short& langId);
 // <Common Files>\Mapora, where language packs and help live; "" when the shell folder is
 // unknown, which leaves the folders below it relative.
@@ -60,8 +56,6 @@ bool QuerySettingsValue(const wchar_t* valueName, void* buffer, DWORD size);
 // A right-to-left switch under HKCU\Software\KVEL: false for left-to-right UI languages,
 // otherwise true unless the value reads "false"; defaultValue when it cannot be read.
 bool ReadRTLSetting(const wchar_t* valueName, bool defaultValue);
-// Callback of EnumSystemLocalesW serving IsValidLangID and GetLangIDFromName.
-BOOL CALLBACK EnumLocalesProc(LPWSTR localeString);
 
 // Calls the HTML Help control's HtmlHelpW; null when the control cannot be loaded.
 HWND CallHtmlHelp(HWND window, const wchar_t* file, UINT command, DWORD_PTR data);

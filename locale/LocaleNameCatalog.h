@@ -12,6 +12,18 @@
 
 namespace KVELLocale {
 
+// GetLocaleInfoW with a buffer of capacity characters; false when the call fails (a text that
+// does not fit fails too). data: every character the call wrote, terminator included.
+bool ReadLocaleInfo(LCID locale, LCTYPE type, int capacity, std::wstring& data);
+// The same for a text: up to its first zero character.
+bool ReadLocaleText(LCID locale, LCTYPE type, int capacity, std::wstring& text);
+
+// Walks the system's supported locales (EnumSystemLocalesW, LCID_SUPPORTED) in the system's
+// order, handing each one's LANGID and context to visit until visit returns false. The walk ends
+// at the first entry that is no locale identifier. Walks may nest.
+using LocaleVisitor = bool (*)(LANGID langId, void* context);
+void WalkSupportedLocales(LocaleVisitor visit, void* context);
+
 // The ISO names one supported locale goes by.
 struct LocaleIsoNames {
   LANGID langId = 0;

@@ -1,5 +1,6 @@
 // Pushing the user locale into the C runtime and the UI language into the calling thread.
 #include "locale/LocaleInternals.h"
+#include "locale/LocaleNameCatalog.h"
 
 #include <strsafe.h>
 
@@ -9,23 +10,22 @@ namespace KVELLocale {
 
 namespace {
 
-void GetInfoOrEmpty(LCID locale, LCTYPE type, wchar_t (&text)[kLocalePathChars]) {
-  if (GetLocaleInfoW(locale, type, text, kLocalePathChars) <= 0) text[0] = L'\0';
+std::wstring InfoOrEmpty(LCID locale, LCTYPE type) {
+  std::wstring text;
+  if (!ReadLocaleText(locale, type, kLocalePathChars, text)) text.clear();
+  return text;
 }
 
 }  // namespace
 
 KVEL_LOCALE_API void SetLocale(int category) {
   InitLocale();
-  wchar_t language[kLocalePathChars];
-  wchar_t country[kLocalePathChars];
-  wchar_t codePage[kLocalePathChars];
-  GetInfoOrEmpty(GetLocale(), LOCALE_SENGLANGUAGE, language);
-  GetInfoOrEmpty(GetLocale(), LOCALE_SENGCOUNTRY, country);
+  const std::wstring language = InfoOrEmpty(GetLocale(), LOCALE_SENGLANGUAGE);
+  const std::wstring country = InfoOrEmpty(GetLocale(), LOCALE_SENGCOUNTRY);
   // The runtime converts with the system's ANSI code page, whatever the user locale's is.
-  GetInfoOrEmpty(LOCALE_SYSTEM_DEFAULT, LOCALE_IDEFAULTANSICODEPAGE, codePage);
+  const std::wstring codePage = InfoOrEmpty(LOCALE_SYSTEM_DEFAULT, LOCALE_IDEFAULTANSICODEPAGE);
   wchar_t name[kLocalePathChars];
-  StringCchPrintfW(name, kLocalePathChars, L"%s_%s.%s", language, country, codePage);
+  StringCchPrintfW(name, kLocalePathChars, L"%s_%s.%s", language.c_str(), country.c_str(), codePage.c_str());
   _wsetlocale(category, name);
 }
 

@@ -1,10 +1,12 @@
 // The process-wide user locale and UI language, and where their language packs live.
 #include "framework/RegistryKey.h"
 #include "locale/LanguagePacks.h"
+#include "locale/LocaleNameCatalog.h"
 #include "locale/SuiteUserSettings.h"
 
 #include <shlobj.h>
 #include <shlwapi.h>
+#include <strsafe.h>
 
 namespace KVELLocale {
 
@@ -39,12 +41,13 @@ void GetUILanguageBase(wchar_t (&base)[kLocalePathChars]) {
 // ISO names of a locale; both empty when the language name cannot be had.
 void FetchLocaleNames(LANGID id, wchar_t (&langName)[kLocaleNameChars],
                       wchar_t (&countryName)[kLocaleNameChars]) {
-  if (GetLocaleInfoW(id, LOCALE_SISO3166CTRYNAME, countryName, kLocaleNameChars) <= 0)
-    countryName[0] = L'\0';
-  if (GetLocaleInfoW(id, LOCALE_SISO639LANGNAME, langName, kLocaleNameChars) <= 0) {
-    langName[0] = L'\0';
-    countryName[0] = L'\0';
-  }
+  std::wstring language;
+  std::wstring country;
+  // No country without a language; what fits the wrapper's buffer fits the field.
+  if (ReadLocaleText(id, LOCALE_SISO639LANGNAME, kLocaleNameChars, language))
+    ReadLocaleText(id, LOCALE_SISO3166CTRYNAME, kLocaleNameChars, country);
+  StringCchCopyW(langName, kLocaleNameChars, language.c_str());
+  StringCchCopyW(countryName, kLocaleNameChars, country.c_str());
 }
 
 bool IsEnglish(LANGID id) { return id == kEnglishUS || id == kEnglishNeutral; }

@@ -1,5 +1,6 @@
 // Right-to-left switches: the UI language's script and the user's RTL, RTLUI and TABLERTL values.
 #include "locale/LocaleInternals.h"
+#include "locale/LocaleNameCatalog.h"
 #include "locale/SuiteUserSettings.h"
 
 #include <cstring>
@@ -12,11 +13,13 @@ LocaleState& s = g_localeState;
 
 // Bit 123 of the Unicode subset bitfield marks a right-to-left script.
 bool FontSignatureIsRightToLeft(LCID locale) {
-  wchar_t signature[16] = {};
-  if (GetLocaleInfoW(locale, LOCALE_FONTSIGNATURE, signature, 16) <= 0) return false;
-  DWORD usb[4];  // the Unicode subset bitfield opens the signature
-  static_assert(sizeof usb <= sizeof signature, "the bitfield lies within the signature");
-  std::memcpy(usb, signature, sizeof usb);
+  // The signature is 16 characters of binary data, not text.
+  std::wstring signature;
+  if (!ReadLocaleInfo(locale, LOCALE_FONTSIGNATURE, 16, signature)) return false;
+  DWORD usb[4] = {};  // the Unicode subset bitfield opens the signature
+  signature.resize(16, L'\0');
+  static_assert(sizeof usb <= 16 * sizeof(wchar_t), "the bitfield lies within the signature");
+  std::memcpy(usb, signature.data(), sizeof usb);
   return (usb[3] & (1UL << 27)) != 0;
 }
 

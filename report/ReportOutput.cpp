@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "framework/ScopedHandle.h"
+#include "framework/Strings.h"
 
 namespace {
 
@@ -78,11 +79,8 @@ DWORD WriteFileContent(const std::wstring& path, const std::string& utf8) {
 }
 
 std::wstring DescribeSystemError(DWORD error) {
-  fw::ScopedLocalMemory<wchar_t> text;
-  const DWORD length =
-      FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_IGNORE_INSERTS,
-                     nullptr, error, 0, reinterpret_cast<LPWSTR>(text.Receive()), 0, nullptr);
-  std::wstring description = length > 0 && text ? std::wstring(text.Get(), length) : std::wstring();
+  // A message is set into a sentence of the tool's own: its closing full stop goes.
+  std::wstring description = fw::SystemErrorText(error);
   while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r' ||
                                   description.back() == L' ' || description.back() == L'.'))
     description.pop_back();

@@ -3,18 +3,12 @@
 #include <nlohmann/json.hpp>
 #include <vector>
 
-#include "framework/RegistryKey.h"
-#include "locale/SuiteUserSettings.h"
+#include "framework/Strings.h"
 #include "report/ReportOutput.h"
-#include "settings/AdvancedSettings.h"
-#include "settings/URLTokenManager.h"
 
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-// What ReadRegistryDword hands back when UILANGID is missing; the console reads it the same way.
-constexpr DWORD kNoStoredLanguage = 0xFFFFFFFF;
 
 struct InstallField {
   const char* name;
@@ -40,19 +34,6 @@ const InstallField kInstallFields[] = {
     {"productVersion", &ProductInstallInfo::productVersion},
 };
 
-std::wstring ComputerName() {
-  std::vector<wchar_t> name(MAX_COMPUTERNAME_LENGTH + 1);
-  DWORD size = static_cast<DWORD>(name.size());
-  if (!GetComputerNameW(name.data(), &size)) {
-    // Longer names than NetBIOS allows exist; size now holds what the name needs.
-    if (GetLastError() != ERROR_BUFFER_OVERFLOW) return std::wstring();
-    name.resize(size + 1);
-    size = static_cast<DWORD>(name.size());
-    if (!GetComputerNameW(name.data(), &size)) return std::wstring();
-  }
-  return std::wstring(name.data(), size);
-}
-
 Json Product(bool installed, const std::wstring& key, const ProductInstallInfo& info) {
   Json product = {{"installed", installed}, {"registryKey", ToUtf8(key)}};
   for (const InstallField& field : kInstallFields) product[field.name] = ToUtf8(info.*field.member);
@@ -67,23 +48,10 @@ void DetectProductsAsTheConsoleDoes(InstalledProducts& products) {
   DetectInstalledProducts(products);
 }
 
-StoredSuiteSettings ReadStoredSuiteSettings(const InstalledProducts& products) {
-  StoredSuiteSettings settings;
-  const DWORD uiLangId = ReadRegistryDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue, kNoStoredLanguage);
-  if (uiLangId != kNoStoredLanguage) settings.uiLangId = uiLangId;
-  settings.enableKuei = ReadEnableKuei(products);
-  // The dialog's own reader creates the per-user key; an inventory only opens it.
-  settings.localPortalSupport = LocalPortalSupportFromValue(
-      ReadRegistryDword(HKEY_CURRENT_USER, kConnectionSettingsKey, kSupportLocalPortalValue, 0));
-  CURLTokenManager tokenManager;
-  settings.portalServerSetByAdmin = tokenManager.PortalServerSetByAdmin();
-  return settings;
-}
-
 WorkstationInventory ReadWorkstationInventory(const InstalledProducts& products) {
   WorkstationInventory inventory;
   inventory.release = products.version;
-  inventory.computerName = ComputerName();
+  inventory.computerName = fw::ComputerName();
   inventory.desktopKey = products.desktopKey;
   inventory.engineKey = products.engineKey;
   inventory.skyloftKey = products.skyloftKey;

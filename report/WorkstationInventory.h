@@ -9,16 +9,8 @@
 #include <string>
 
 #include "inventory/InstallationReport.h"
+#include "settings/SuiteSettings.h"
 
-struct StoredSuiteSettings {
-  // UILANGID as the console takes it; none when it is not stored.
-  std::optional<DWORD> uiLangId;
-  // Raw EnableKUEI of the Desktop product; 0 when absent.
-  DWORD enableKuei = 0;
-  // 1 when "Support Local Portal" counts as set, else 0.
-  DWORD localPortalSupport = 0;
-  bool portalServerSetByAdmin = false;
-};
 
 struct WorkstationInventory {
   std::wstring release;
@@ -36,7 +28,6 @@ struct WorkstationInventory {
 // must be initialised on the calling thread.
 void DetectProductsAsTheConsoleDoes(InstalledProducts& products);
 
-StoredSuiteSettings ReadStoredSuiteSettings(const InstalledProducts& products);
 WorkstationInventory ReadWorkstationInventory(const InstalledProducts& products);
 
 // One JSON document (UTF-8, ending with a line break); its schema is in the README, section

@@ -31,10 +31,8 @@ std::wstring ToolString(UINT id) {
   static const HINSTANCE self = GetModuleHandleW(nullptr);
   static const HINSTANCE pack = KVELLocale::LoadLocalizedRes(self);
   for (HINSTANCE module : {pack, self}) {
-    const wchar_t* text = nullptr;
-    // With a zero length LoadStringW points into the resource, which is not zero-terminated.
-    const int length = module ? LoadStringW(module, id, reinterpret_cast<LPWSTR>(&text), 0) : 0;
-    if (length > 0 && text != nullptr) return std::wstring(text, static_cast<size_t>(length));
+    std::wstring text = fw::LoadStringFrom(module, id);
+    if (!text.empty()) return text;
   }
   return std::wstring();
 }

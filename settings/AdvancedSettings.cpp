@@ -33,18 +33,6 @@ void StoreUILangID(DWORD langId) {
     DeleteStoredUILangID();
 }
 
-DWORD ReadEnableKuei(const InstalledProducts& products) {
-  return ReadRegistryDword(HKEY_LOCAL_MACHINE, EnableKueiKey(products.desktopKey), kEnableKueiValue, 0);
-}
-
-DWORD ReadSupportLocalPortal() {
-  // Any value of at most 4 bytes counts, whatever its type; a failed read leaves 0.
-  DWORD value = 0;
-  fw::RegistryKey key;
-  if (OpenConnectionSettings(key) == ERROR_SUCCESS) key.ReadDword(kSupportLocalPortalValue, value);
-  return LocalPortalSupportFromValue(value);
-}
-
 void PersistAdvancedSettings(AdminSession& mainDlg) {
   // Without a parent the box belongs to the main window, as every box of the program does.
   CClientMaporaAdvancedConfigDlg dlg;

@@ -7,10 +7,9 @@
 
 #include "locale/SuiteUserSettings.h"
 #include "settings/SettingsRegistry.h"
+#include "settings/SuiteSettings.h"
 
 class AdminSession;
-struct InstalledProducts;
-
 
 // The workstation page's "Advanced..." handler: runs the Advanced Configuration dialog modally
 // and writes what it chose.
@@ -24,10 +23,3 @@ bool CanWriteMachineSettings();
 void StoreUILangID(DWORD langId);
 // Removes UILANGID; nothing happens when the key cannot be opened.
 void DeleteStoredUILangID();
-
-// The raw EnableKUEI of the Desktop product (0 when absent).
-DWORD ReadEnableKuei(const InstalledProducts& products);
-// "Support Local Portal" counts only when it holds exactly 1: 1 then, else 0.
-inline DWORD LocalPortalSupportFromValue(DWORD stored) { return stored == 1 ? 1 : 0; }
-// 1 when "Support Local Portal" holds exactly 1, else 0. Creates the per-user key when missing.
-DWORD ReadSupportLocalPortal();

@@ -12,10 +12,7 @@ namespace {
 constexpr int kLocaleTextChars = 256;
 
 bool ReadLocaleText(LANGID langId, LCTYPE type, CString& text) {
-  wchar_t buffer[kLocaleTextChars] = L"";
-  if (GetLocaleInfoW(langId, type, buffer, kLocaleTextChars) <= 0) return false;
-  text = buffer;
-  return true;
+  return KVELLocale::ReadLocaleText(langId, type, kLocaleTextChars, text);
 }
 
 // What one list build learns about names and languages, kept for that build only: many folders

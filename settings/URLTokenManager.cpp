@@ -1,11 +1,11 @@
 #include "settings/URLTokenManager.h"
 
-#include "framework/RegistryKey.h"
+#include "settings/SuiteSettings.h"
 
 CURLTokenManager::CURLTokenManager() = default;
 
 CURLTokenManager::~CURLTokenManager() = default;
 
 bool CURLTokenManager::PortalServerSetByAdmin() {
-  return ReadRegistryDword(HKEY_LOCAL_MACHINE, kPortalMachineSettingsKey, kPortalServerSetByAdminValue, 0) != 0;
+  return ReadPortalServerSetByAdmin();
 }
