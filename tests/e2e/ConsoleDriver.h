@@ -7,6 +7,7 @@
 #include <commctrl.h>
 
 #include <algorithm>
+#include <cstdio>
 #include <functional>
 #include <string>
 #include <vector>
@@ -34,13 +35,15 @@ inline std::wstring WindowsPath(const std::string& hostPath) {
 
 inline std::wstring ConsolePath() { return WindowsPath(MAPORA_CONSOLE_EXE); }
 
-// The new process, or null when it could not be started.
+// The new process, or null (with the reason on standard error) when it could not be started.
 inline HANDLE Start(std::wstring commandLine) {
   STARTUPINFOW startup{};
   startup.cb = sizeof startup;
   PROCESS_INFORMATION info{};
-  if (!CreateProcessW(nullptr, &commandLine[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup, &info))
+  if (!CreateProcessW(nullptr, &commandLine[0], nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup, &info)) {
+    std::fprintf(stderr, "cannot start %ls: error %lu\n", commandLine.c_str(), GetLastError());
     return nullptr;
+  }
   CloseHandle(info.hThread);
   return info.hProcess;
 }
@@ -120,7 +123,18 @@ class Process {
       return GetDlgItem(window, IDC_PAGE_TREE) == nullptr && Text(window) == *caption;
     }};
     // EnumWindows answers false once the search stops at a match.
-    WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)) || !Running(); });
+    if (!WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)) || !Running(); })) {
+      const DWORD waitError = GetLastError();
+      DWORD exitCode = 0;
+      GetExitCodeProcess(m_process, &exitCode);
+      std::fprintf(stderr, "no window %ls after %lu ms: exit code %lu (%lu: still running), last error %lu\n",
+                   caption ? caption->c_str() : L"with the page tree", kWaitMs, exitCode,
+                   static_cast<unsigned long>(STILL_ACTIVE), waitError);
+    } else if (search.found == nullptr) {
+      DWORD exitCode = 0;
+      GetExitCodeProcess(m_process, &exitCode);
+      std::fprintf(stderr, "the process ended with exit code %lu before showing the window\n", exitCode);
+    }
     return search.found;
   }
 

@@ -3,7 +3,9 @@
 
 #include <cstdlib>
 #include <tuple>
+#include <vector>
 
+#include "framework/RegistryKey.h"
 #include "inventory/InstalledProducts.h"
 #include "inventory/RunningSuiteApps.h"
 #include "tests/support/TestSupport.h"
@@ -37,10 +39,44 @@ TEST(DistinctRuntimeVersions, DesktopAndEngineVersionsOnceEachInOrder) {
             (std::vector<std::wstring>{L"10.6-Beta", L"10.5a"}));
 }
 
-TEST(ReadsThe64BitView, KeysNamingSkyloftsReleaseCaseSensitively) {
-  EXPECT_TRUE(ReadsThe64BitView(L"SOFTWARE\\Kvel\\Skyloft2016.1\\Settings"));
-  EXPECT_FALSE(ReadsThe64BitView(L"SOFTWARE\\Skyloft"));
-  EXPECT_FALSE(ReadsThe64BitView(L"SOFTWARE\\Kvel\\SKYLOFT2016.1"));
+// Typed reads take only their own type and size and leave the default alone otherwise; the
+// lenient reads take what the console's rules take.
+TEST(RegistryKey, TypedReadsRefuseOtherTypesLenientOnesDoNot) {
+  ScopedHiveOverride hives;
+  const DWORD kPreset = 0xAAAAAAAA;
+  const struct {
+    const char* name;
+    DWORD type;
+    std::vector<BYTE> data;
+    LONG dwordStatus;
+    DWORD dword;
+    LONG stringStatus;
+    DWORD lenientDword;
+  } rows[] = {
+      {"a REG_DWORD", REG_DWORD, {1, 0, 0, 0}, ERROR_SUCCESS, 1, ERROR_UNSUPPORTED_TYPE, 1},
+      {"2 bytes of REG_DWORD", REG_DWORD, {1, 0}, ERROR_INVALID_DATA, kPreset, ERROR_UNSUPPORTED_TYPE, 0xAAAA0001},
+      {"REG_BINARY of 4 bytes", REG_BINARY, {1, 0, 0, 0}, ERROR_UNSUPPORTED_TYPE, kPreset, ERROR_UNSUPPORTED_TYPE, 1},
+      {"REG_SZ \"A\"", REG_SZ, {'A', 0, 0, 0}, ERROR_UNSUPPORTED_TYPE, kPreset, ERROR_SUCCESS, 0x41},
+      {"REG_EXPAND_SZ of 6 bytes", REG_EXPAND_SZ, {'%', 0, 'A', 0, 0, 0}, ERROR_UNSUPPORTED_TYPE, kPreset,
+       ERROR_SUCCESS, kPreset},
+  };
+  for (const auto& row : rows) {
+    SetRegistryBytes(HKEY_LOCAL_MACHINE, L"Typed", L"Value", row.type, row.data.data(),
+                     static_cast<DWORD>(row.data.size()));
+    fw::RegistryKey key;
+    ASSERT_EQ(key.Open(HKEY_LOCAL_MACHINE, L"Typed"), ERROR_SUCCESS);
+    DWORD dword = kPreset;
+    EXPECT_EQ(key.ReadDword(L"Value", dword), row.dwordStatus) << row.name;
+    EXPECT_EQ(dword, row.dword) << row.name;
+    std::wstring text = L"preset";
+    EXPECT_EQ(key.ReadString(L"Value", text), row.stringStatus) << row.name;
+    if (row.stringStatus != ERROR_SUCCESS) {
+      EXPECT_EQ(text, L"preset") << row.name << ": untouched";
+    }
+    DWORD lenient = kPreset;
+    key.ReadUpTo4BytesOverDword(L"Value", lenient);
+    EXPECT_EQ(lenient, row.lenientDword) << row.name;
+  }
 }
 
 TEST(ReadRegistryString, AnyValueIsTextUpToItsFirstZeroCharacter) {

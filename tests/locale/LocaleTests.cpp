@@ -95,10 +95,7 @@ TEST(ResolveHelpReference, TheMostSpecificExistingCopy) {
 
 // With no control registered, the system's copy, even with a file of its name first on the search path.
 TEST(HtmlHelpControl, OnlyWhenNeededAndOnlyTheSystemsCopy) {
-  ScopedHiveOverride hives;
-  HKEY noClasses = nullptr;
-  RegCreateKeyExW(HKEY_CURRENT_USER, L"NoClasses", 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &noClasses, nullptr);
-  RegOverridePredefKey(HKEY_CLASSES_ROOT, noClasses);
+  ScopedHiveOverride hives;  // an empty HKEY_CLASSES_ROOT too
   ScopedDirectory decoy(ModuleFolder() + L"\\help-control-decoy");
   ASSERT_TRUE(CopyFileTo(ModuleFolder() + L"\\locale_test_res.dll", decoy.Path() + L"\\hhctrl.ocx"));
   SetDllDirectoryW(decoy.Path().c_str());

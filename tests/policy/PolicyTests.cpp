@@ -103,13 +103,22 @@ std::wstring Data(IXMLDOMNode* value) {
   return decimal.empty() ? kUnread : decimal.front();
 }
 
-// "HKLM\KEY\VALUE NAME=data", key and value name from the nearest element that names them.
-std::wstring Write(IXMLDOMNode* node, const std::wstring& data) {
-  const bool machine = String(node, L"ancestor-or-self::p:policy/@class") == L"Machine";
-  return Upper((machine ? L"HKLM\\" : L"HKCU\\") +
-               String(node, L"ancestor-or-self::*[@key or @defaultKey][1]/@*[name()='key' or name()='defaultKey']") +
-               L"\\" + String(node, L"ancestor-or-self::*[@valueName][1]/@valueName")) +
-         L"=" + data;
+// One value a policy writes; key and value name in upper case.
+struct RegistryWrite {
+  bool machine;
+  std::wstring key;
+  std::wstring valueName;
+  std::wstring data;
+
+  std::wstring Name() const { return (machine ? L"HKLM\\" : L"HKCU\\") + key + L"\\" + valueName; }
+  std::wstring Text() const { return Name() + L"=" + data; }  // "HKLM\KEY\VALUE NAME=data"
+};
+
+// Key and value name from the nearest element that names them.
+RegistryWrite Write(IXMLDOMNode* node, const std::wstring& data) {
+  return {String(node, L"ancestor-or-self::p:policy/@class") == L"Machine",
+          Upper(String(node, L"ancestor-or-self::*[@key or @defaultKey][1]/@*[name()='key' or name()='defaultKey']")),
+          Upper(String(node, L"ancestor-or-self::*[@valueName][1]/@valueName")), data};
 }
 
 unsigned short LangId(const std::wstring& language) {
@@ -177,14 +186,15 @@ TEST(PolicyTemplate, WritesOnlyTheValuesTheSuiteReadsInBothViews) {
       SCOPED_TRACE(String(policy.Get(), L"@name") + L": " + state);
       Bag views[2];  // native, WOW6432Node
       for (const Node& value : Select(policy.Get(), state)) {
-        std::wstring write = Write(value.Get(), Data(value.Get()));
-        const bool wow = write.compare(4, 22, L"\\SOFTWARE\\WOW6432NODE\\") == 0;
-        if (wow) write.erase(14, 12);
-        const std::wstring name = write.substr(0, write.find(L'='));
+        RegistryWrite write = Write(value.Get(), Data(value.Get()));
+        const std::wstring wowSoftware = L"SOFTWARE\\WOW6432NODE\\";
+        const bool wow = write.key.compare(0, wowSoftware.size(), wowSoftware) == 0;
+        if (wow) write.key = L"SOFTWARE\\" + write.key.substr(wowSoftware.size());
+        const std::wstring name = write.Name();
         EXPECT_EQ(read.count(name), 1u) << name;
-        EXPECT_NE(write.substr(name.size() + 1), kUnread) << name;
+        EXPECT_NE(write.data, kUnread) << name;
         written.insert(name);
-        views[wow].insert(write);
+        views[wow].insert(write.Text());
       }
       EXPECT_EQ(views[1], String(policy.Get(), L"@class") == L"Machine" ? views[0] : Bag());
     }
@@ -240,10 +250,9 @@ TEST_P(PolicyConsole, ShowsWhatThePolicyWrote) {
   std::wstring values = kStates[1];
   if (row.pack) values = L"p:elements//p:value[p:decimal/@value='" + std::to_wstring(langId) + L"']";
   for (const Node& value : Select(policy.front().Get(), values)) {
-    const std::wstring write = Write(value.Get(), Data(value.Get()));
-    const size_t equals = write.find(L'='), slash = write.rfind(L'\\', equals);
-    SetRegistryDword(write.compare(0, 4, L"HKLM") ? HKEY_CURRENT_USER : HKEY_LOCAL_MACHINE, write.substr(5, slash - 5),
-                     write.substr(slash + 1, equals - slash - 1).c_str(), std::stoul(write.substr(equals + 1)));
+    const RegistryWrite write = Write(value.Get(), Data(value.Get()));
+    SetRegistryDword(write.machine ? HKEY_LOCAL_MACHINE : HKEY_CURRENT_USER, write.key, write.valueName.c_str(),
+                     std::stoul(write.data));
   }
   Process console(L"", shared.Path() + L"\\MaporaAdmin.exe", {L"KVEL_DESKTOP10.5_INSTALLED=1"});
   HWND main = console.WaitForMainWindow();

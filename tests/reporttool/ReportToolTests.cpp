@@ -20,8 +20,15 @@ constexpr char kTextStart[] = " DESKTOP\r\n\r\n    Installation Information\r\n 
 
 struct Outcome {
   DWORD exitCode = 0xFFFFFFFF;
-  std::string output[3];  // standard output, standard error, and what "--out report.txt" wrote
+  std::string standardOutput;
+  std::string standardError;
+  std::string reportFile;  // what "--out report.txt" wrote
 };
+
+std::string FileContent(const std::wstring& path) {
+  std::ifstream file(path.c_str(), std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>());
+}
 
 // MaporaReport run by cmd in a scratch folder with the marker ("NAME=value") set. No run may change HKLM\SOFTWARE
 // or HKCU (Wine's display driver refreshes HKLM\SYSTEM for every process; the test runs alone, see CMakeLists).
@@ -38,17 +45,21 @@ Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kD
   HANDLE process = Start(L"cmd /c \"cd /d \"" + folder.Path() + L"\" && set \"" + marker + L"\" && \"" +
                          WindowsPath(MAPORA_REPORT_EXE) + L"\" " + arguments + L" >out 2>err\"");
   Outcome run;
-  WaitForSingleObject(process, kWaitMs);
+  if (!CheckCall(process != nullptr, "starting MaporaReport " + std::string(arguments.begin(), arguments.end())))
+    return run;
+  const DWORD waited = WaitForSingleObject(process, kWaitMs);
+  const DWORD waitError = GetLastError();
   GetExitCodeProcess(process, &run.exitCode);
+  EXPECT_EQ(waited, WAIT_OBJECT_0) << "MaporaReport " << std::string(arguments.begin(), arguments.end())
+                                   << " did not end: exit code " << run.exitCode << ", last error "
+                                   << Win32ErrorText(waitError);
   CloseHandle(process);
   EXPECT_EQ(WaitForSingleObject(changed, 0), static_cast<DWORD>(WAIT_TIMEOUT)) << "registry changed by " << arguments;
   for (HKEY key : {software, user}) RegCloseKey(key);
   CloseHandle(changed);
-  const wchar_t* const files[] = {L"\\out", L"\\err", L"\\report.txt"};
-  for (int i = 0; i < 3; ++i) {
-    std::ifstream file((folder.Path() + files[i]).c_str(), std::ios::binary);
-    run.output[i].assign(std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>());
-  }
+  run.standardOutput = FileContent(folder.Path() + L"\\out");
+  run.standardError = FileContent(folder.Path() + L"\\err");
+  run.reportFile = FileContent(folder.Path() + L"\\report.txt");
   return run;
 }
 
@@ -84,7 +95,7 @@ TEST_F(Workstation, TextIsTheConsolePage) {
     std::string page(shown.size() * 3, '\0');
     page.resize(static_cast<size_t>(WideCharToMultiByte(CP_UTF8, 0, shown.data(), static_cast<int>(shown.size()),
                                                         &page[0], static_cast<int>(page.size()), nullptr, nullptr)));
-    EXPECT_EQ(run.output[0], page);
+    EXPECT_EQ(run.standardOutput, page);
     EXPECT_NE(shown.find(heading), std::wstring::npos) << "not in the language asked for";
   }
 }
@@ -92,7 +103,7 @@ TEST_F(Workstation, TextIsTheConsolePage) {
 // Values no installer writes, in the Server key (never detected, its values reported all the same):
 // each lone surrogate arrives as U+FFFD. The suite settings as stored, first with none stored.
 TEST_F(Workstation, JsonCarriesTheRegistryValues) {
-  EXPECT_EQ(Json::parse(RunReport(L"--json").output[0])["settings"],
+  EXPECT_EQ(Json::parse(RunReport(L"--json").standardOutput)["settings"],
             Json::parse(R"({"displayLanguage":{"uiLangId":null,"followsWindows":true},"localPortalSupport":false,
                             "improvementProgram":{"enableKuei":0,"on":false},"portalServerSetByAdmin":false})"));
   const std::tuple<const wchar_t*, DWORD, std::wstring, const char*, Json> kRows[] = {  // stored, then expected
@@ -114,24 +125,32 @@ TEST_F(Workstation, JsonCarriesTheRegistryValues) {
   const std::wstring connection = L"SOFTWARE\\KVEL\\Mapora Connection\\Settings";
   SetRegistryDword(HKEY_CURRENT_USER, connection, L"Support Local Portal", 2);
   SetRegistryDword(HKEY_LOCAL_MACHINE, connection, L"Portal Server Set By Admin", 1);
-  const Json document = Json::parse(RunReport(L"--json").output[0]);
+  const Json document = Json::parse(RunReport(L"--json").standardOutput);
   for (const auto& [valueName, type, stored, pointer, expected] : kRows)
     EXPECT_EQ(document.value(Json::json_pointer(pointer), Json()), expected) << pointer;
 }
 
 // Exit codes, and how each output starts: standard output, standard error, and report.txt.
 TEST_F(Workstation, ExitCodesAndMessages) {
-  const std::tuple<const wchar_t*, DWORD, std::array<const char*, 3>> kRows[] = {
-      {L"--json", 0, {"{\n  \"release\": \"10.5\",", "", ""}},
-      {L"--help", 0, {"Usage: MaporaReport [--json] [--out FILE]\r\n", "", ""}},
-      {L"--bogus", 2, {"", "MaporaReport: unknown option --bogus\r\nUsage: ", ""}},
-      {L"--out", 2, {"", "MaporaReport: --out needs a file name\r\nUsage: ", ""}},
-      {L"--out no\\r.txt", 1, {"", "MaporaReport: cannot write no\\r.txt: ", ""}},
-      {L"--out report.txt", 0, {"", "", kTextStart}}};
-  for (const auto& [arguments, exitCode, starts] : kRows) {
-    const Outcome run = RunReport(arguments);
-    EXPECT_EQ(run.exitCode, exitCode) << arguments;
-    for (int i = 0; i < 3; ++i) EXPECT_EQ(run.output[i].substr(0, std::strlen(starts[i])), starts[i]) << arguments;
+  const struct {
+    const wchar_t* arguments;
+    DWORD exitCode;
+    const char* outputStart;
+    const char* errorStart;
+    const char* fileStart;
+  } kRows[] = {{L"--json", 0, "{\n  \"release\": \"10.5\",", "", ""},
+               {L"--help", 0, "Usage: MaporaReport [--json] [--out FILE]\r\n", "", ""},
+               {L"--bogus", 2, "", "MaporaReport: unknown option --bogus\r\nUsage: ", ""},
+               {L"--out", 2, "", "MaporaReport: --out needs a file name\r\nUsage: ", ""},
+               {L"--out no\\r.txt", 1, "", "MaporaReport: cannot write no\\r.txt: ", ""},
+               {L"--out report.txt", 0, "", "", kTextStart}};
+  auto start = [](const std::string& text, const char* expected) { return text.substr(0, std::strlen(expected)); };
+  for (const auto& row : kRows) {
+    const Outcome run = RunReport(row.arguments);
+    EXPECT_EQ(run.exitCode, row.exitCode) << row.arguments;
+    EXPECT_EQ(start(run.standardOutput, row.outputStart), row.outputStart) << row.arguments;
+    EXPECT_EQ(start(run.standardError, row.errorStart), row.errorStart) << row.arguments;
+    EXPECT_EQ(start(run.reportFile, row.fileStart), row.fileStart) << row.arguments;
   }
 }
 

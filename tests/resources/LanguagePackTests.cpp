@@ -45,29 +45,42 @@ std::map<UINT, std::vector<std::wstring>> StringArguments(HMODULE module) {
   std::map<UINT, std::vector<std::wstring>> strings;
   for (WORD block : Ids(module, RT_STRING)) {
     DWORD size = 0;
-    auto p = reinterpret_cast<const WCHAR*>(Data(module, RT_STRING, block, &size)), end = p + size / sizeof(WCHAR);
-    for (UINT slot = 0; slot < 16 && p < end; p += *p + 1, ++slot)
-      if (*p) strings[(block - 1u) * 16u + slot] = Arguments(std::wstring(p + 1, *p));
+    const auto* entry = reinterpret_cast<const WCHAR*>(Data(module, RT_STRING, block, &size));
+    const WCHAR* const end = entry + size / sizeof(WCHAR);
+    // Each entry is its length followed by that many characters.
+    for (UINT slot = 0; slot < 16 && entry < end; entry += *entry + 1, ++slot)
+      if (*entry) strings[(block - 1u) * 16u + slot] = Arguments(std::wstring(entry + 1, *entry));
   }
   return strings;
 }
 
+// Where the fields of a DLGTEMPLATEEX and of its DLGITEMTEMPLATEEX entries lie, in WORDs.
+namespace dialog_words {
+constexpr size_t kSignature = 1;  // 0xFFFF for the extended template
+constexpr size_t kStyle = 6;      // low word
+constexpr size_t kItemCount = 8;
+constexpr size_t kMenu = 13;          // then class and caption, each a name or an ordinal
+constexpr size_t kFontBeforeFace = 3;  // point size, weight, italic and charset
+constexpr size_t kItemId = 10;         // a DWORD
+constexpr size_t kItemClass = 12;      // then text, then creation data
+}  // namespace dialog_words
+
 // The control identifiers of a DLGTEMPLATEEX and its DLGITEMTEMPLATEEX entries.
 std::multiset<DWORD> ControlIds(HMODULE module, WORD dialog) {
-  auto p = reinterpret_cast<const WORD*>(Data(module, RT_DIALOG, dialog));
-  if (!p || p[1] != 0xFFFF) return {};
-  auto skipName = [](const WORD* q) {
-    return *q == 0xFFFF ? q + 2 : q + std::wcslen(reinterpret_cast<const wchar_t*>(q)) + 1;
+  namespace w = dialog_words;
+  const auto* const start = reinterpret_cast<const WORD*>(Data(module, RT_DIALOG, dialog));
+  if (!start || start[w::kSignature] != 0xFFFF) return {};
+  auto skipName = [](const WORD* name) {
+    return *name == 0xFFFF ? name + 2 : name + std::wcslen(reinterpret_cast<const wchar_t*>(name)) + 1;
   };
-  const WORD *start = p, count = p[8];
-  p = skipName(skipName(skipName(p + 13)));                         // menu, class, caption
-  if (start[6] & (DS_SETFONT | DS_SHELLFONT)) p = skipName(p + 3);  // size, weight, italic, face
+  const WORD* at = skipName(skipName(skipName(start + w::kMenu)));
+  if (start[w::kStyle] & (DS_SETFONT | DS_SHELLFONT)) at = skipName(at + w::kFontBeforeFace);
   std::multiset<DWORD> ids;
-  for (WORD i = 0; i < count; ++i) {
-    p = start + ((p - start + 1) & ~1);  // each entry starts on a DWORD
-    ids.insert(MAKELONG(p[10], p[11]));
-    p = skipName(skipName(p + 12));  // class, text
-    p += (*p + 1) / 2 + 1;           // creation data
+  for (WORD item = 0; item < start[w::kItemCount]; ++item) {
+    at = start + ((at - start + 1) & ~1);  // each entry starts on a DWORD
+    ids.insert(MAKELONG(at[w::kItemId], at[w::kItemId + 1]));
+    at = skipName(skipName(at + w::kItemClass));
+    at += (*at + 1) / 2 + 1;  // creation data: its size in bytes, then the data
   }
   return ids;
 }

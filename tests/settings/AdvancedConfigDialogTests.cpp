@@ -60,7 +60,6 @@ class Workstation : public AdminSession {
     for (const wchar_t* folder : {L"d\\bin\\de-AT", L"d\\bin\\xx-YY", L"e\\bin\\de"}) m_folders.MakeDir(folder);
     m_folders.MakeFile(L"d\\bin\\it");
   }
-  void EnableApply() override {}
   void OpenAdvancedSettings() override {}
 
   void Open(const Row& row) {

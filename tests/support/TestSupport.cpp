@@ -1,12 +1,17 @@
 #include "tests/support/TestSupport.h"
 
+#include <gtest/gtest.h>
 #include <shellapi.h>
 #include <shlobj.h>
 #include <shlwapi.h>
 
+#include <cstdlib>
+
 namespace testing_support {
 
 namespace {
+
+constexpr wchar_t kScratchHives[] = L"Software\\MaporaTestHives";
 
 // RegDeleteTree has no view flag: the key is opened in its view and cleared from there.
 void DeleteKeyTree(HKEY root, const std::wstring& path, REGSAM view) {
@@ -18,13 +23,21 @@ void DeleteKeyTree(HKEY root, const std::wstring& path, REGSAM view) {
   RegDeleteKeyExW(root, path.c_str(), view, 0);
 }
 
+std::string Narrow(const std::wstring& text) {
+  std::string narrow;
+  for (wchar_t c : text) narrow += c < 0x80 ? static_cast<char>(c) : '?';
+  return narrow;
+}
+
 void SetValue(HKEY root, const std::wstring& path, REGSAM view, const wchar_t* name, DWORD type, const void* data,
               DWORD size) {
   HKEY key = nullptr;
-  if (RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr) !=
-      ERROR_SUCCESS)
+  const std::string what = Narrow(path) + " " + Narrow(name ? name : L"(default)");
+  if (!CheckStatus(
+          RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr),
+          "creating " + what))
     return;
-  RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size);
+  CheckStatus(RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size), "setting " + what);
   RegCloseKey(key);
 }
 
@@ -38,9 +51,56 @@ void RemoveTree(const std::wstring& path) {
   SHFileOperationW(&operation);
 }
 
-void CreateDirectories(const std::wstring& path) { SHCreateDirectoryExW(nullptr, path.c_str(), nullptr); }
+void CreateDirectories(const std::wstring& path) {
+  const int status = SHCreateDirectoryExW(nullptr, path.c_str(), nullptr);
+  if (status != ERROR_ALREADY_EXISTS && status != ERROR_FILE_EXISTS)
+    CheckStatus(status, "creating folder " + Narrow(path));
+}
+
+// Scratch hives of test programs that are no longer running.
+void SweepDeadScratchHives() {
+  HKEY hives = nullptr;
+  if (RegOpenKeyExW(HKEY_CURRENT_USER, kScratchHives, 0, KEY_READ, &hives) != ERROR_SUCCESS) return;
+  std::vector<std::wstring> dead;
+  wchar_t name[32];
+  for (DWORD index = 0;; ++index) {
+    DWORD length = 32;
+    if (RegEnumKeyExW(hives, index, name, &length, nullptr, nullptr, nullptr, nullptr) != ERROR_SUCCESS) break;
+    const DWORD processId = std::wcstoul(name, nullptr, 10);
+    HANDLE process = OpenProcess(SYNCHRONIZE, FALSE, processId);
+    const bool running = process != nullptr && WaitForSingleObject(process, 0) == WAIT_TIMEOUT;
+    if (process != nullptr) CloseHandle(process);
+    if (!running && processId != GetCurrentProcessId()) dead.push_back(name);
+  }
+  RegCloseKey(hives);
+  for (const std::wstring& key : dead) SHDeleteKeyW(HKEY_CURRENT_USER, (std::wstring(kScratchHives) + L"\\" + key).c_str());
+}
 
 }  // namespace
+
+std::string Win32ErrorText(DWORD error) {
+  wchar_t* text = nullptr;
+  FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
+                 error, 0, reinterpret_cast<LPWSTR>(&text), 0, nullptr);
+  std::wstring description = text != nullptr ? text : L"";
+  LocalFree(text);
+  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
+    description.pop_back();
+  return std::to_string(error) + " (" + Narrow(description) + ")";
+}
+
+bool CheckStatus(LONG status, const std::string& what) {
+  if (status == ERROR_SUCCESS) return true;
+  ADD_FAILURE() << what << " failed: error " << Win32ErrorText(static_cast<DWORD>(status));
+  return false;
+}
+
+bool CheckCall(BOOL succeeded, const std::string& what) {
+  if (succeeded) return true;
+  const DWORD error = GetLastError();
+  ADD_FAILURE() << what << " failed: error " << Win32ErrorText(error);
+  return false;
+}
 
 ScopedRegistryKey::ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view)
     : root_(root), path_(std::move(path)), view_(view) {
@@ -93,7 +153,7 @@ bool CopyFileTo(const std::wstring& from, const std::wstring& to) {
   PathRemoveFileSpecW(&folder[0]);
   folder.resize(wcslen(folder.c_str()));
   CreateDirectories(folder);
-  return CopyFileW(from.c_str(), to.c_str(), FALSE) != FALSE;
+  return CheckCall(CopyFileW(from.c_str(), to.c_str(), FALSE), "copying " + Narrow(from) + " to " + Narrow(to));
 }
 
 ScopedDirectory::ScopedDirectory(std::wstring path) : path_(std::move(path)) { RemoveTree(path_); }
@@ -111,11 +171,11 @@ std::wstring ScopedDirectory::MakeFile(const std::wstring& relative, const std::
   std::wstring folder = full.substr(0, full.find_last_of(L'\\'));
   CreateDirectories(folder);
   HANDLE file = CreateFileW(full.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS, 0, nullptr);
-  if (file != INVALID_HANDLE_VALUE) {
-    DWORD written = 0;
-    WriteFile(file, content.data(), static_cast<DWORD>(content.size()), &written, nullptr);
-    CloseHandle(file);
-  }
+  if (!CheckCall(file != INVALID_HANDLE_VALUE, "creating " + Narrow(full))) return full;
+  DWORD written = 0;
+  CheckCall(WriteFile(file, content.data(), static_cast<DWORD>(content.size()), &written, nullptr),
+            "writing " + Narrow(full));
+  CloseHandle(file);
   return full;
 }
 
@@ -133,21 +193,29 @@ std::wstring ModuleFolder() {
 }
 
 ScopedHiveOverride::ScopedHiveOverride()
-    : scratch_(L"Software\\MaporaTestHives\\" + std::to_wstring(GetCurrentProcessId())) {
+    : scratch_(std::wstring(kScratchHives) + L"\\" + std::to_wstring(GetCurrentProcessId())) {
+  SweepDeadScratchHives();
   SHDeleteKeyW(HKEY_CURRENT_USER, scratch_.c_str());
-  RegCreateKeyExW(HKEY_CURRENT_USER, (scratch_ + L"\\HKCU").c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &user_,
-                  nullptr);
-  RegCreateKeyExW(HKEY_CURRENT_USER, (scratch_ + L"\\HKLM").c_str(), 0, nullptr, 0, KEY_ALL_ACCESS, nullptr,
-                  &machine_, nullptr);
-  RegOverridePredefKey(HKEY_LOCAL_MACHINE, machine_);
-  RegOverridePredefKey(HKEY_CURRENT_USER, user_);
+  const struct {
+    HKEY root;
+    const wchar_t* name;
+    HKEY* scratch;
+  } hives[] = {{HKEY_CURRENT_USER, L"HKCU", &user_},
+               {HKEY_LOCAL_MACHINE, L"HKLM", &machine_},
+               {HKEY_CLASSES_ROOT, L"HKCR", &classes_}};
+  // Every scratch key is made before the first override: HKEY_CURRENT_USER is one of them.
+  for (const auto& hive : hives)
+    CheckStatus(RegCreateKeyExW(HKEY_CURRENT_USER, (scratch_ + L"\\" + hive.name).c_str(), 0, nullptr, 0,
+                                KEY_ALL_ACCESS, nullptr, hive.scratch, nullptr),
+                "creating the scratch " + Narrow(hive.name));
+  for (const auto& hive : hives)
+    CheckStatus(RegOverridePredefKey(hive.root, *hive.scratch), "overriding " + Narrow(hive.name));
 }
 
 ScopedHiveOverride::~ScopedHiveOverride() {
-  RegOverridePredefKey(HKEY_CURRENT_USER, nullptr);
-  RegOverridePredefKey(HKEY_LOCAL_MACHINE, nullptr);
-  RegCloseKey(user_);
-  RegCloseKey(machine_);
+  for (HKEY root : {HKEY_CLASSES_ROOT, HKEY_CURRENT_USER, HKEY_LOCAL_MACHINE}) RegOverridePredefKey(root, nullptr);
+  for (HKEY scratch : {user_, machine_, classes_})
+    if (scratch != nullptr) RegCloseKey(scratch);
   SHDeleteKeyW(HKEY_CURRENT_USER, scratch_.c_str());
 }
 

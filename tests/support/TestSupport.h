@@ -9,6 +9,13 @@
 
 namespace testing_support {
 
+// "5 (Access is denied.)": a Win32 error code with the system's text, for failure messages.
+std::string Win32ErrorText(DWORD error);
+// Setup calls that tests depend on: a failure fails the running test with what and the error (a
+// registry status, or GetLastError for the BOOL form) and returns false.
+bool CheckStatus(LONG status, const std::string& what);
+bool CheckCall(BOOL succeeded, const std::string& what);
+
 // Deletes a registry key tree when created and again when destroyed; creates nothing itself.
 class ScopedRegistryKey {
  public:
@@ -28,10 +35,11 @@ class ScopedRegistryKey {
   REGSAM view_;
 };
 
-// For the life of the object, HKEY_CURRENT_USER and HKEY_LOCAL_MACHINE of this process are fresh
-// empty keys under a scratch key of the real HKEY_CURRENT_USER (removed again at the end), so
-// in-process registry tests neither see nor change the real hives and may run in parallel.
-// COM registration and child processes still see the real hives.
+// For the life of the object, HKEY_CURRENT_USER, HKEY_LOCAL_MACHINE and HKEY_CLASSES_ROOT of this
+// process are fresh empty keys under a scratch key of the real HKEY_CURRENT_USER (removed again at
+// the end), so in-process registry tests neither see nor change the real hives and may run in
+// parallel. Child processes still see the real hives. A scratch key left by a test program that
+// died is swept away by the next one; an override that cannot be installed fails the test.
 class ScopedHiveOverride {
  public:
   ScopedHiveOverride();
@@ -43,6 +51,7 @@ class ScopedHiveOverride {
   std::wstring scratch_;
   HKEY user_ = nullptr;
   HKEY machine_ = nullptr;
+  HKEY classes_ = nullptr;
 };
 
 // Write a value, creating its key and the key's parents. Meant for tests under
@@ -52,7 +61,7 @@ void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, 
 void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, DWORD type, const void* data,
                       DWORD size);
 
-// Reads a DWORD value; false when the key or value is missing or not a DWORD.
+// Reads a DWORD value; false when the key or value is missing or not a DWORD (no failure).
 bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
 
 // A folder tree removed (recursively) when created and again when destroyed.
@@ -64,15 +73,16 @@ class ScopedDirectory {
   ScopedDirectory& operator=(const ScopedDirectory&) = delete;
 
   const std::wstring& Path() const { return path_; }
-  // Creates path\relative (and its parents) as a folder.
+  // Creates path\relative (and its parents) as a folder; a failure fails the test.
   std::wstring MakeDir(const std::wstring& relative) const;
-  // Writes a small file path\relative, creating its folders.
+  // Writes a small file path\relative, creating its folders; a failure fails the test.
   std::wstring MakeFile(const std::wstring& relative, const std::string& content = "x") const;
 
  private:
   std::wstring path_;
 };
 
+// Copies a file, creating the target's folders; a failure fails the test.
 bool CopyFileTo(const std::wstring& from, const std::wstring& to);
 
 // <Common Files>\Mapora as the program sees it.
