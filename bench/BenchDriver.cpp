@@ -24,6 +24,9 @@
 #include <string>
 #include <vector>
 
+#include "framework/ScopedHandle.h"
+#include "res/resource.h"
+
 namespace {
 
 constexpr int kDefaultRuns = 15;
@@ -38,8 +41,6 @@ constexpr DWORD kTraceSettleMs = 400;
 // "Advanced..." is clicked this long after the main window is ready, as a person would: the
 // window has painted and whatever the console does after showing it is over.
 constexpr DWORD kClickDelayMs = 500;
-constexpr int kAdvancedButtonId = 3601;
-constexpr int kLanguageListId = 3563;
 // The list holds the Windows-language and English entries before any language pack is listed.
 constexpr LRESULT kEntriesBeforePacks = 2;
 constexpr wchar_t kTraceVariable[] = L"MAPORA_STARTUP_TRACE";
@@ -126,7 +127,7 @@ HWND ReadyMainWindow(DWORD processId) {
 HWND ReadyAdvancedDialog(DWORD processId, HWND mainWindow) {
   for (HWND window : VisibleTopLevelWindows(processId)) {
     if (window == mainWindow) continue;
-    HWND list = FindDescendant(window, L"ComboBox", kLanguageListId);
+    HWND list = FindDescendant(window, L"ComboBox", IDC_LANGUAGE_LIST);
     if (list != nullptr && Ask(list, CB_GETCOUNT) > kEntriesBeforePacks) return window;
   }
   return nullptr;
@@ -141,14 +142,14 @@ struct Mark {
 
 std::vector<Mark> ReadTrace(const std::wstring& path) {
   std::vector<Mark> marks;
-  HANDLE file = CreateFileW(path.c_str(), GENERIC_READ, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
-                            nullptr, OPEN_EXISTING, FILE_ATTRIBUTE_NORMAL, nullptr);
-  if (file == INVALID_HANDLE_VALUE) return marks;
+  fw::ScopedHandle file(CreateFileW(path.c_str(), GENERIC_READ,
+                                   FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE, nullptr, OPEN_EXISTING,
+                                   FILE_ATTRIBUTE_NORMAL, nullptr));
+  if (!file) return marks;
   std::string text;
   char buffer[4096];
   DWORD read = 0;
-  while (ReadFile(file, buffer, sizeof buffer, &read, nullptr) && read > 0) text.append(buffer, read);
-  CloseHandle(file);
+  while (ReadFile(file.Get(), buffer, sizeof buffer, &read, nullptr) && read > 0) text.append(buffer, read);
   std::istringstream lines(text);
   std::string line;
   while (std::getline(lines, line)) {
@@ -252,6 +253,8 @@ class Run {
       std::fprintf(stderr, "cannot start %ls (error %lu)\n", program.c_str(), GetLastError());
       m_process = {};
     }
+    m_thread.Reset(m_process.hThread);
+    m_processOwner.Reset(m_process.hProcess);
   }
 
   ~Run() {
@@ -260,8 +263,6 @@ class Run {
       TerminateProcess(m_process.hProcess, 1);
       WaitForSingleObject(m_process.hProcess, kExitTimeoutMs);
     }
-    CloseHandle(m_process.hThread);
-    CloseHandle(m_process.hProcess);
   }
 
   Run(const Run&) = delete;
@@ -284,14 +285,14 @@ class Run {
 
   // Clicks "Advanced..." and polls until its dialog is ready; the click and ready times, or false.
   bool OpenAdvanced(double& clicked, double& ready) {
-    HWND button = FindDescendant(m_mainWindow, L"Button", kAdvancedButtonId);
+    HWND button = FindDescendant(m_mainWindow, L"Button", IDC_ADVANCED);
     if (button == nullptr || !IsWindowVisible(button)) {
       std::fprintf(stderr, "the console shows no visible \"Advanced...\" button\n");
       return false;
     }
     Sleep(kClickDelayMs);
     clicked = NowMicroseconds();
-    PostMessageW(GetParent(button), WM_COMMAND, MAKEWPARAM(kAdvancedButtonId, BN_CLICKED),
+    PostMessageW(GetParent(button), WM_COMMAND, MAKEWPARAM(IDC_ADVANCED, BN_CLICKED),
                  reinterpret_cast<LPARAM>(button));
     const double deadline = clicked + kReadyTimeoutMs * 1000.0;
     while (NowMicroseconds() < deadline) {
@@ -308,16 +309,15 @@ class Run {
   // The names of the libraries the process has loaded, in lower case and sorted.
   std::vector<std::wstring> Libraries() const {
     std::vector<std::wstring> names;
-    HANDLE snapshot = CreateToolhelp32Snapshot(TH32CS_SNAPMODULE, m_process.dwProcessId);
-    if (snapshot == INVALID_HANDLE_VALUE) return names;
+    fw::ScopedHandle snapshot(CreateToolhelp32Snapshot(TH32CS_SNAPMODULE, m_process.dwProcessId));
+    if (!snapshot) return names;
     MODULEENTRY32W module = {};
     module.dwSize = sizeof module;
-    for (BOOL more = Module32FirstW(snapshot, &module); more; more = Module32NextW(snapshot, &module)) {
+    for (BOOL more = Module32FirstW(snapshot.Get(), &module); more; more = Module32NextW(snapshot.Get(), &module)) {
       std::wstring name = module.szModule;
       CharLowerBuffW(&name[0], static_cast<DWORD>(name.size()));
       names.push_back(name);
     }
-    CloseHandle(snapshot);
     std::sort(names.begin(), names.end());
     return names;
   }
@@ -345,6 +345,8 @@ class Run {
  private:
   std::wstring m_traceFile;
   PROCESS_INFORMATION m_process = {};
+  fw::ScopedHandle m_processOwner;  // m_process's handles, closed when the run goes
+  fw::ScopedHandle m_thread;
   double m_start = 0.0;
   HWND m_mainWindow = nullptr;
 };
@@ -460,33 +462,15 @@ void PrintRatio(const char* name, const std::vector<double>& times, const std::v
               Ratio(Minimum(times), Minimum(base)));
 }
 
-}  // namespace
-
-int wmain(int argc, wchar_t** argv) {
-  Options options;
-  if (!ParseOptions(argc, argv, options)) {
-    std::fprintf(stderr,
-                 "usage: BenchDriver --console PATH --floor PATH [--baseline PATH] [--runs N] [--trace FOLDER] "
-                 "[--close]\n");
-    return 2;
-  }
-  if (!options.traceFolder.empty()) CreateDirectoryW(options.traceFolder.c_str(), nullptr);
-  std::setvbuf(stdout, nullptr, _IONBF, 0);
-
-  std::vector<Subject> subjects;
-  subjects.push_back(MakeSubject("console", L"console", options.console, true));
-  subjects.push_back(MakeSubject("floor", L"floor", options.floor, false));
-  if (!options.baseline.empty())
-    subjects.push_back(MakeSubject("baseline console", L"baseline", options.baseline, true));
+// Warm-up, start-up and Advanced Configuration runs, each program in turn; false when one failed.
+bool Measure(const Options& options, std::vector<Subject>& subjects) {
   Subject& console = subjects[0];
-  Subject& floor = subjects[1];
   Subject* baseline = options.baseline.empty() ? nullptr : &subjects[2];
   const size_t count = subjects.size();
-
   std::printf("warming up (%d runs of each program)\n", kWarmUpRuns);
   for (int i = 0; i < kWarmUpRuns; ++i) {
     for (Subject& subject : subjects) {
-      if (!TimeStart(options, subject, i, subject.isConsole, true)) return 1;
+      if (!TimeStart(options, subject, i, subject.isConsole, true)) return false;
     }
   }
 
@@ -494,17 +478,26 @@ int wmain(int argc, wchar_t** argv) {
   for (int i = 0; i < options.runs; ++i) {
     // The order rotates too, so that no program always follows the same one.
     for (size_t turn = 0; turn < count; ++turn) {
-      if (!TimeStart(options, subjects[(static_cast<size_t>(i) + turn) % count], i, false, false)) return 1;
+      if (!TimeStart(options, subjects[(static_cast<size_t>(i) + turn) % count], i, false, false)) return false;
     }
   }
 
   std::printf("Advanced Configuration: %d openings, each in a freshly started console\n", options.runs);
   for (int i = 0; i < options.runs; ++i) {
     const bool baselineFirst = baseline != nullptr && i % 2 != 0;
-    if (baselineFirst && !TimeStart(options, *baseline, i, true, false)) return 1;
-    if (!TimeStart(options, console, i, true, false)) return 1;
-    if (baseline != nullptr && !baselineFirst && !TimeStart(options, *baseline, i, true, false)) return 1;
+    if (baselineFirst && !TimeStart(options, *baseline, i, true, false)) return false;
+    if (!TimeStart(options, console, i, true, false)) return false;
+    if (baseline != nullptr && !baselineFirst && !TimeStart(options, *baseline, i, true, false)) return false;
   }
+  return true;
+}
+
+// Medians, minimums and ratios, the libraries only the console loads, the traced steps, and the
+// summary line for scripts.
+void PrintResults(const Options& options, const std::vector<Subject>& subjects) {
+  const Subject& console = subjects[0];
+  const Subject& floor = subjects[1];
+  const Subject* baseline = options.baseline.empty() ? nullptr : &subjects[2];
 
   std::printf("\nprocess created -> main window visible with the report text filled\n");
   for (const Subject& subject : subjects) PrintTimes(subject, subject.startupMs);
@@ -554,5 +547,31 @@ int wmain(int argc, wchar_t** argv) {
     std::printf(" baseline_ms=%.1f baseline_advanced_ms=%.1f", Median(baseline->startupMs),
                 Median(baseline->advancedMs));
   std::printf(" runs=%d traced=%d\n", options.runs, options.traceFolder.empty() ? 0 : 1);
+}
+
+int RunBenchmark(const Options& options) {
+  if (!options.traceFolder.empty()) CreateDirectoryW(options.traceFolder.c_str(), nullptr);
+  std::setvbuf(stdout, nullptr, _IONBF, 0);
+
+  std::vector<Subject> subjects;
+  subjects.push_back(MakeSubject("console", L"console", options.console, true));
+  subjects.push_back(MakeSubject("floor", L"floor", options.floor, false));
+  if (!options.baseline.empty())
+    subjects.push_back(MakeSubject("baseline console", L"baseline", options.baseline, true));
+  if (!Measure(options, subjects)) return 1;
+  PrintResults(options, subjects);
   return 0;
+}
+
+}  // namespace
+
+int wmain(int argc, wchar_t** argv) {
+  Options options;
+  if (!ParseOptions(argc, argv, options)) {
+    std::fprintf(stderr,
+                 "usage: BenchDriver --console PATH --floor PATH [--baseline PATH] [--runs N] [--trace FOLDER] "
+                 "[--close]\n");
+    return 2;
+  }
+  return RunBenchmark(options);
 }
