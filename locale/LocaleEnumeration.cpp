@@ -2,7 +2,6 @@
 #include "locale/LocaleInternals.h"
 #include "locale/LocaleNameCatalog.h"
 
-#include <cwchar>
 #include <utility>
 #include <vector>
 
@@ -10,27 +9,23 @@ namespace KVELLocale {
 
 namespace {
 
-// The LANGID of one entry of the system's enumeration; false for an entry that ends it (no
-// hexadecimal number, or one whose LANGID is 0).
-bool ParseLocaleString(const wchar_t* localeString, LANGID& id) {
-  unsigned int value = 0;
-  if (!localeString || swscanf(localeString, L"%x", &value) != 1) return false;
-  id = LOWORD(value);
-  return id != 0;
-}
-
 struct LocaleWalk {
   LocaleVisitor visit;
   void* context;
 };
 
-// The walk in progress on this thread: the enumeration's callback takes no context of its own.
-thread_local LocaleWalk* t_walk = nullptr;
-
-BOOL CALLBACK VisitLocale(LPWSTR localeString) {
-  LANGID id = 0;
-  if (!ParseLocaleString(localeString, id)) return FALSE;
-  return t_walk->visit(id, t_walk->context) ? TRUE : FALSE;
+// Neutral locales (a language alone) and the invariant one are no supported locale; locales
+// without an identifier of their own (added by a user or an application) are passed over. A name
+// the system cannot map at all ends the walk.
+BOOL CALLBACK VisitLocale(LPWSTR name, DWORD flags, LPARAM context) {
+  if ((flags & LOCALE_SPECIFICDATA) == 0 || name == nullptr || name[0] == L'\0') return TRUE;
+  const LCID locale = LocaleNameToLCID(name, 0);
+  if (locale == LOCALE_CUSTOM_UNSPECIFIED || locale == LOCALE_CUSTOM_DEFAULT || locale == LOCALE_CUSTOM_UI_DEFAULT)
+    return TRUE;
+  const LANGID id = LANGIDFROMLCID(locale);
+  if (id == 0) return FALSE;
+  const auto* walk = reinterpret_cast<const LocaleWalk*>(context);
+  return walk->visit(id, walk->context) ? TRUE : FALSE;
 }
 
 struct NameSearch {
@@ -43,9 +38,7 @@ struct NameSearch {
 
 void WalkSupportedLocales(LocaleVisitor visit, void* context) {
   LocaleWalk walk = {visit, context};
-  LocaleWalk* outer = std::exchange(t_walk, &walk);
-  EnumSystemLocalesW(VisitLocale, LCID_SUPPORTED);
-  t_walk = outer;
+  EnumSystemLocalesEx(VisitLocale, LOCALE_WINDOWS, reinterpret_cast<LPARAM>(&walk), nullptr);
 }
 
 bool ReadLocaleInfo(LCID locale, LCTYPE type, int capacity, std::wstring& data) {

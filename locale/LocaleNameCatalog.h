@@ -18,9 +18,8 @@ bool ReadLocaleInfo(LCID locale, LCTYPE type, int capacity, std::wstring& data);
 // The same for a text: up to its first zero character.
 bool ReadLocaleText(LCID locale, LCTYPE type, int capacity, std::wstring& text);
 
-// Walks the system's supported locales (EnumSystemLocalesW, LCID_SUPPORTED) in the system's
-// order, handing each one's LANGID and context to visit until visit returns false. The walk ends
-// at the first entry that is no locale identifier. Walks may nest.
+// Walks the system's specific locales (a language with its country) in the system's order,
+// handing each one's LANGID and context to visit until visit returns false. Walks may nest.
 using LocaleVisitor = bool (*)(LANGID langId, void* context);
 void WalkSupportedLocales(LocaleVisitor visit, void* context);
 
@@ -46,8 +45,7 @@ class LocaleNameCatalog {
  public:
   explicit LocaleNameCatalog(std::vector<LocaleIsoNames> locales) : m_locales(std::move(locales)) {}
 
-  // The supported locales (EnumSystemLocalesW, LCID_SUPPORTED) in the system's order, up to the
-  // first entry that is no locale identifier, as the by-name enumeration sees them.
+  // The supported locales in the system's order, as GetLangIDFromName walks them.
   static LocaleNameCatalog FromSystem();
 
   // As GetLangIDFromName: the first locale in the catalog's order that the name names wins.
