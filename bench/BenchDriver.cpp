@@ -20,12 +20,15 @@
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
+#include <functional>
 #include <sstream>
 #include <string>
 #include <vector>
 
+#include "bench/BenchDialog.h"
 #include "framework/ScopedHandle.h"
 #include "res/resource.h"
+#include "tests/e2e/ConsoleDriver.h"
 
 namespace {
 
@@ -71,40 +74,17 @@ double Minimum(const std::vector<double>& values) {
 
 double Ratio(double value, double base) { return base > 0.0 ? value / base : 0.0; }
 
-std::wstring FolderOf(const std::wstring& path) {
-  const size_t slash = path.find_last_of(L"\\/");
-  return slash == std::wstring::npos ? std::wstring() : path.substr(0, slash);
-}
-
 // --- Windows of another process ------------------------------------------------------------
 
-BOOL CALLBACK CollectWindow(HWND window, LPARAM list) {
-  reinterpret_cast<std::vector<HWND>*>(list)->push_back(window);
-  return TRUE;
-}
-
-std::vector<HWND> VisibleTopLevelWindows(DWORD processId) {
-  std::vector<HWND> all;
-  EnumWindows(CollectWindow, reinterpret_cast<LPARAM>(&all));
-  std::vector<HWND> visible;
-  for (HWND window : all) {
+// The first visible top-level window of the process that matches.
+HWND FindTopLevel(DWORD processId, const std::function<bool(HWND)>& matches) {
+  e2e::WindowSearch search{[&](HWND window) {
     DWORD owner = 0;
     GetWindowThreadProcessId(window, &owner);
-    if (owner == processId && IsWindowVisible(window)) visible.push_back(window);
-  }
-  return visible;
-}
-
-// A descendant of parent of the given class (case ignored) and, unless id is 0, control id.
-HWND FindDescendant(HWND parent, const wchar_t* className, int id) {
-  std::vector<HWND> all;
-  EnumChildWindows(parent, CollectWindow, reinterpret_cast<LPARAM>(&all));
-  for (HWND window : all) {
-    wchar_t name[64] = L"";
-    if (GetClassNameW(window, name, 64) == 0 || _wcsicmp(name, className) != 0) continue;
-    if (id == 0 || GetDlgCtrlID(window) == id) return window;
-  }
-  return nullptr;
+    return owner == processId && IsWindowVisible(window) && matches(window);
+  }};
+  EnumWindows(e2e::MatchWindow, reinterpret_cast<LPARAM>(&search));
+  return search.found;
 }
 
 // The answer of the window's thread, or -1 when it does not answer in time.
@@ -114,23 +94,20 @@ LRESULT Ask(HWND window, UINT message, WPARAM wParam = 0, LPARAM lParam = 0) {
   return static_cast<LRESULT>(result);
 }
 
-// The main window once it is visible and its rich edit holds text; null before.
-HWND ReadyMainWindow(DWORD processId) {
-  for (HWND window : VisibleTopLevelWindows(processId)) {
-    HWND report = FindDescendant(window, L"RichEdit20W", 0);
-    if (report != nullptr && Ask(report, WM_GETTEXTLENGTH) > 0) return window;
-  }
-  return nullptr;
+// The main window once it is visible and its report (control reportId) holds text; null before.
+HWND ReadyMainWindow(DWORD processId, int reportId) {
+  return FindTopLevel(processId, [reportId](HWND window) {
+    HWND report = e2e::Control(window, reportId);
+    return report != nullptr && Ask(report, WM_GETTEXTLENGTH) > 0;
+  });
 }
 
 // Advanced Configuration once it is visible and its language list holds the language packs.
 HWND ReadyAdvancedDialog(DWORD processId, HWND mainWindow) {
-  for (HWND window : VisibleTopLevelWindows(processId)) {
-    if (window == mainWindow) continue;
-    HWND list = FindDescendant(window, L"ComboBox", IDC_LANGUAGE_LIST);
-    if (list != nullptr && Ask(list, CB_GETCOUNT) > kEntriesBeforePacks) return window;
-  }
-  return nullptr;
+  return FindTopLevel(processId, [mainWindow](HWND window) {
+    HWND list = window != mainWindow ? e2e::Control(window, IDC_LANGUAGE_LIST) : nullptr;
+    return list != nullptr && Ask(list, CB_GETCOUNT) > kEntriesBeforePacks;
+  });
 }
 
 // --- Traces ----------------------------------------------------------------------------------
@@ -236,47 +213,40 @@ struct Options {
 
 class Run {
  public:
-  Run(const std::wstring& program, const std::wstring& traceFile) : m_traceFile(traceFile) {
+  // reportId: the control whose text says the main window is ready.
+  Run(const std::wstring& program, int reportId, const std::wstring& traceFile)
+      : m_traceFile(traceFile), m_reportId(reportId) {
     if (traceFile.empty()) {
       SetEnvironmentVariableW(kTraceVariable, nullptr);
     } else {
       DeleteFileW(traceFile.c_str());
       SetEnvironmentVariableW(kTraceVariable, traceFile.c_str());
     }
-    std::wstring commandLine = L"\"" + program + L"\"";
-    const std::wstring folder = FolderOf(program);
-    STARTUPINFOW startup = {};
-    startup.cb = sizeof startup;
     m_start = NowMicroseconds();
-    if (!CreateProcessW(program.c_str(), &commandLine[0], nullptr, nullptr, FALSE, 0, nullptr,
-                        folder.empty() ? nullptr : folder.c_str(), &startup, &m_process)) {
-      std::fprintf(stderr, "cannot start %ls (error %lu)\n", program.c_str(), GetLastError());
-      m_process = {};
-    }
-    m_thread.Reset(m_process.hThread);
-    m_processOwner.Reset(m_process.hProcess);
+    m_process.Reset(e2e::Start(L"\"" + program + L"\""));
+    m_processId = m_process ? GetProcessId(m_process.Get()) : 0;
   }
 
   ~Run() {
-    if (m_process.hProcess == nullptr) return;
-    if (WaitForSingleObject(m_process.hProcess, 0) == WAIT_TIMEOUT) {
-      TerminateProcess(m_process.hProcess, 1);
-      WaitForSingleObject(m_process.hProcess, kExitTimeoutMs);
+    if (!m_process) return;
+    if (WaitForSingleObject(m_process.Get(), 0) == WAIT_TIMEOUT) {
+      TerminateProcess(m_process.Get(), 1);
+      WaitForSingleObject(m_process.Get(), kExitTimeoutMs);
     }
   }
 
   Run(const Run&) = delete;
   Run& operator=(const Run&) = delete;
 
-  bool Started() const { return m_process.hProcess != nullptr; }
+  bool Started() const { return m_process.IsValid(); }
   double Start() const { return m_start; }
 
   // Polls until the main window is ready; its time in microseconds, or a negative value.
   double WaitForMainWindow() {
     const double deadline = m_start + kReadyTimeoutMs * 1000.0;
     while (NowMicroseconds() < deadline) {
-      if (WaitForSingleObject(m_process.hProcess, 0) != WAIT_TIMEOUT) return -1.0;
-      m_mainWindow = ReadyMainWindow(m_process.dwProcessId);
+      if (WaitForSingleObject(m_process.Get(), 0) != WAIT_TIMEOUT) return -1.0;
+      m_mainWindow = ReadyMainWindow(m_processId, m_reportId);
       if (m_mainWindow != nullptr) return NowMicroseconds();
       Sleep(kPollIntervalMs);
     }
@@ -285,7 +255,7 @@ class Run {
 
   // Clicks "Advanced..." and polls until its dialog is ready; the click and ready times, or false.
   bool OpenAdvanced(double& clicked, double& ready) {
-    HWND button = FindDescendant(m_mainWindow, L"Button", IDC_ADVANCED);
+    HWND button = e2e::Control(m_mainWindow, IDC_ADVANCED);
     if (button == nullptr || !IsWindowVisible(button)) {
       std::fprintf(stderr, "the console shows no visible \"Advanced...\" button\n");
       return false;
@@ -296,7 +266,7 @@ class Run {
                  reinterpret_cast<LPARAM>(button));
     const double deadline = clicked + kReadyTimeoutMs * 1000.0;
     while (NowMicroseconds() < deadline) {
-      if (ReadyAdvancedDialog(m_process.dwProcessId, m_mainWindow) != nullptr) {
+      if (ReadyAdvancedDialog(m_processId, m_mainWindow) != nullptr) {
         ready = NowMicroseconds();
         return true;
       }
@@ -309,7 +279,7 @@ class Run {
   // The names of the libraries the process has loaded, in lower case and sorted.
   std::vector<std::wstring> Libraries() const {
     std::vector<std::wstring> names;
-    fw::ScopedHandle snapshot(CreateToolhelp32Snapshot(TH32CS_SNAPMODULE, m_process.dwProcessId));
+    fw::ScopedHandle snapshot(CreateToolhelp32Snapshot(TH32CS_SNAPMODULE, m_processId));
     if (!snapshot) return names;
     MODULEENTRY32W module = {};
     module.dwSize = sizeof module;
@@ -325,7 +295,7 @@ class Run {
   double PeakWorkingSetMb() const {
     PROCESS_MEMORY_COUNTERS counters = {};
     counters.cb = sizeof counters;
-    if (!GetProcessMemoryInfo(m_process.hProcess, &counters, sizeof counters)) return 0.0;
+    if (!GetProcessMemoryInfo(m_process.Get(), &counters, sizeof counters)) return 0.0;
     return static_cast<double>(counters.PeakWorkingSetSize) / kBytesPerMegabyte;
   }
 
@@ -334,7 +304,7 @@ class Run {
   double Close(double& pressed) {
     pressed = NowMicroseconds();
     PostMessageW(m_mainWindow, WM_COMMAND, MAKEWPARAM(IDCANCEL, BN_CLICKED), 0);
-    if (WaitForSingleObject(m_process.hProcess, kExitTimeoutMs) != WAIT_OBJECT_0) return -1.0;
+    if (WaitForSingleObject(m_process.Get(), kExitTimeoutMs) != WAIT_OBJECT_0) return -1.0;
     return (NowMicroseconds() - pressed) / 1000.0;
   }
 
@@ -344,9 +314,9 @@ class Run {
 
  private:
   std::wstring m_traceFile;
-  PROCESS_INFORMATION m_process = {};
-  fw::ScopedHandle m_processOwner;  // m_process's handles, closed when the run goes
-  fw::ScopedHandle m_thread;
+  int m_reportId;
+  fw::ScopedHandle m_process;
+  DWORD m_processId = 0;
   double m_start = 0.0;
   HWND m_mainWindow = nullptr;
 };
@@ -388,7 +358,7 @@ bool TimeStart(const Options& options, Subject& subject, int index, bool advance
   const std::wstring traceFile = warmUp ? std::wstring() : TraceFile(options, subject.kind, phase, index);
   // With Advanced Configuration open the main window cannot close; such a run is terminated.
   const bool close = options.close && !advanced;
-  Run run(subject.path, traceFile);
+  Run run(subject.path, subject.isConsole ? IDC_REPORT : IDC_BENCH_REPORT, traceFile);
   if (!run.Started()) return false;
   const double ready = run.WaitForMainWindow();
   if (ready < 0.0) {
