@@ -39,56 +39,43 @@ TEST(DistinctRuntimeVersions, DesktopAndEngineVersionsOnceEachInOrder) {
             (std::vector<std::wstring>{L"10.6-Beta", L"10.5a"}));
 }
 
-// Typed reads take only their own type and size and leave the default alone otherwise; the
-// lenient reads take what the console's rules take.
+// Typed reads take only their own type and size and leave the preset alone otherwise; the lenient
+// reads take any type, as the console's rules do (an installer may write a folder as a DWORD).
 TEST(RegistryKey, TypedReadsRefuseOtherTypesLenientOnesDoNot) {
   ScopedHiveOverride hives;
   const DWORD kPreset = 0xAAAAAAAA;
+  const std::wstring kUntouched = L"preset";
   const struct {
     const char* name;
     DWORD type;
     std::vector<BYTE> data;
-    LONG dwordStatus;
-    DWORD dword;
-    LONG stringStatus;
-    DWORD lenientDword;
+    DWORD dword;        // ReadDword: the value, or kPreset when it fails
+    std::wstring text;  // ReadString: the text, or kUntouched when it fails
+    DWORD shortValue;   // ReadUpTo4BytesOverDword
+    std::wstring anyText;  // ReadAnyValueAsText
   } rows[] = {
-      {"a REG_DWORD", REG_DWORD, {1, 0, 0, 0}, ERROR_SUCCESS, 1, ERROR_UNSUPPORTED_TYPE, 1},
-      {"2 bytes of REG_DWORD", REG_DWORD, {1, 0}, ERROR_INVALID_DATA, kPreset, ERROR_UNSUPPORTED_TYPE, 0xAAAA0001},
-      {"REG_BINARY of 4 bytes", REG_BINARY, {1, 0, 0, 0}, ERROR_UNSUPPORTED_TYPE, kPreset, ERROR_UNSUPPORTED_TYPE, 1},
-      {"REG_SZ \"A\"", REG_SZ, {'A', 0, 0, 0}, ERROR_UNSUPPORTED_TYPE, kPreset, ERROR_SUCCESS, 0x41},
-      {"REG_EXPAND_SZ of 6 bytes", REG_EXPAND_SZ, {'%', 0, 'A', 0, 0, 0}, ERROR_UNSUPPORTED_TYPE, kPreset,
-       ERROR_SUCCESS, kPreset},
+      {"a REG_DWORD", REG_DWORD, {'A', 0, 0, 0}, 0x41, kUntouched, 0x41, L"A"},
+      {"2 bytes of REG_DWORD", REG_DWORD, {'A', 0}, kPreset, kUntouched, 0xAAAA0041, L"A"},
+      {"REG_BINARY with an odd last byte", REG_BINARY, {'A', 0, 'B'}, kPreset, kUntouched, 0xAA420041, L"AB"},
+      {"REG_SZ", REG_SZ, {'A', 0, 0, 0}, kPreset, L"A", 0x41, L"A"},
+      {"an empty REG_SZ", REG_SZ, {}, kPreset, L"", kPreset, L""},
+      {"REG_EXPAND_SZ of 6 bytes", REG_EXPAND_SZ, {'%', 0, 'A', 0, 0, 0}, kPreset, L"%A", kPreset, L"%A"},
   };
   for (const auto& row : rows) {
     SetRegistryBytes(HKEY_LOCAL_MACHINE, L"Typed", L"Value", row.type, row.data.data(),
                      static_cast<DWORD>(row.data.size()));
     fw::RegistryKey key;
     ASSERT_EQ(key.Open(HKEY_LOCAL_MACHINE, L"Typed"), ERROR_SUCCESS);
-    DWORD dword = kPreset;
-    EXPECT_EQ(key.ReadDword(L"Value", dword), row.dwordStatus) << row.name;
+    DWORD dword = kPreset, shortValue = kPreset;
+    std::wstring text = kUntouched, anyText = kUntouched;
+    EXPECT_EQ(key.ReadDword(L"Value", dword) == ERROR_SUCCESS, row.dword != kPreset) << row.name;
     EXPECT_EQ(dword, row.dword) << row.name;
-    std::wstring text = L"preset";
-    EXPECT_EQ(key.ReadString(L"Value", text), row.stringStatus) << row.name;
-    if (row.stringStatus != ERROR_SUCCESS) {
-      EXPECT_EQ(text, L"preset") << row.name << ": untouched";
-    }
-    DWORD lenient = kPreset;
-    key.ReadUpTo4BytesOverDword(L"Value", lenient);
-    EXPECT_EQ(lenient, row.lenientDword) << row.name;
-  }
-}
-
-TEST(ReadRegistryString, AnyValueIsTextUpToItsFirstZeroCharacter) {
-  ScopedHiveOverride hives;
-  const struct { const char* name; DWORD type; std::wstring text; DWORD bytes; } rows[] = {
-      {"a DWORD, as some installers write a folder, up to its zero", REG_DWORD, L"A", 4},
-      {"an odd last byte is half a character", REG_BINARY, L"AB", 3},
-      {"empty is not the default", REG_SZ, L"", 0},
-  };
-  for (const auto& row : rows) {
-    SetRegistryBytes(HKEY_LOCAL_MACHINE, kDesktopKey, L"InstallDir", row.type, row.text.c_str(), row.bytes);
-    EXPECT_EQ(ReadRegistryString(HKEY_LOCAL_MACHINE, kDesktopKey, L"InstallDir", L"-"), row.text) << row.name;
+    EXPECT_EQ(key.ReadString(L"Value", text) == ERROR_SUCCESS, row.text != kUntouched) << row.name;
+    EXPECT_EQ(text, row.text) << row.name;
+    key.ReadUpTo4BytesOverDword(L"Value", shortValue);
+    EXPECT_EQ(shortValue, row.shortValue) << row.name;
+    EXPECT_EQ(key.ReadAnyValueAsText(L"Value", anyText), ERROR_SUCCESS) << row.name;
+    EXPECT_EQ(anyText, row.anyText) << row.name;
   }
 }
 

@@ -6,6 +6,7 @@
 #include <set>
 
 #include "framework/ComRef.h"
+#include "framework/ScopedHandle.h"
 #include "inventory/ProductRegistry.h"
 #include "locale/LocaleInternals.h"
 #include "locale/SuiteUserSettings.h"
@@ -54,11 +55,10 @@ struct Xml {
                           Variant(L"xmlns:p='http://schemas.microsoft.com/GroupPolicy/2006/07/PolicyDefinitions'"));
     VARIANT_BOOL loaded = VARIANT_FALSE;
     ComRef<IXMLDOMParseError> parseError;
-    BSTR reason = nullptr;
+    fw::ScopedBstr reason;
     if (document->load(Variant(WindowsPath(MAPORA_POLICY_DIR) + L"\\" + name), &loaded) == S_OK) return;
-    if (SUCCEEDED(document->get_parseError(parseError.Receive())) && parseError) parseError->get_reason(&reason);
-    error = name + L": " + (reason ? reason : L"");
-    SysFreeString(reason);
+    if (SUCCEEDED(document->get_parseError(parseError.Receive())) && parseError) parseError->get_reason(reason.Receive());
+    error = name + L": " + (reason ? reason.Get() : L"");
   }
   operator IXMLDOMNode*() const { return document.Get(); }
   ComRef<IXMLDOMDocument2> document;
@@ -76,10 +76,9 @@ std::vector<Node> Select(IXMLDOMNode* context, const std::wstring& xpath) {
 std::vector<std::wstring> Strings(IXMLDOMNode* context, const std::wstring& xpath) {
   std::vector<std::wstring> strings;
   for (const Node& node : Select(context, xpath)) {
-    BSTR text = nullptr;
-    node->get_text(&text);
-    strings.emplace_back(text ? text : L"");
-    SysFreeString(text);
+    fw::ScopedBstr text;
+    node->get_text(text.Receive());
+    strings.emplace_back(text ? text.Get() : L"");
   }
   return strings;
 }
@@ -155,8 +154,9 @@ TEST(PolicyTemplate, EveryLanguageDefinesExactlyWhatTheTemplateUses) {
     for (const std::wstring kind : {L"string", L"presentation"}) {
       SCOPED_TRACE(std::wstring(language.first) + L" " + kind);
       std::set<std::wstring> used;
-      for (const std::wstring& reference : Strings(admx, L"//@*[starts-with(., '$(" + kind + L".')]"))
-        used.insert(reference.substr(kind.size() + 3, reference.size() - kind.size() - 4));
+      const std::wstring opening = L"$(" + kind + L".";  // "$(string.ID)"
+      for (const std::wstring& reference : Strings(admx, L"//@*[starts-with(., '" + opening + L"')]"))
+        used.insert(reference.substr(opening.size(), reference.size() - opening.size() - 1));
       EXPECT_EQ(BagOf(Strings(adml, L"//p:" + kind + L"/@id")), Bag(used.begin(), used.end()));
       for (const std::wstring& id : used) {
         const std::wstring defined = L"//p:" + kind + L"[@id='" + id + L"']";

@@ -104,9 +104,4 @@ TEST_P(LanguagePack, HoldsWhatTheConsoleLoadsFromIt) {
 
 INSTANTIATE_TEST_SUITE_P(Packs, LanguagePack, testing::Values(L"fr", L"de", L"es", L"ja", L"zh-CN", L"ar"));
 
-TEST(Arguments, SeesConversionsAndInsertsInOrder) {
-  EXPECT_EQ(Arguments(L"100%% %-5ls (build %1!s!) %2 50%"), (std::vector<std::wstring>{L"%ls", L"%1", L"%2", L"%"}));
-  EXPECT_NE(Arguments(L"%d %s"), Arguments(L"%s %d"));
-}
-
 }  // namespace

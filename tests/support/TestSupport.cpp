@@ -7,6 +7,8 @@
 
 #include <cstdlib>
 
+#include "framework/Strings.h"
+
 namespace testing_support {
 
 namespace {
@@ -78,16 +80,7 @@ void SweepDeadScratchHives() {
 
 }  // namespace
 
-std::string Win32ErrorText(DWORD error) {
-  wchar_t* text = nullptr;
-  FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
-                 error, 0, reinterpret_cast<LPWSTR>(&text), 0, nullptr);
-  std::wstring description = text != nullptr ? text : L"";
-  LocalFree(text);
-  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
-    description.pop_back();
-  return std::to_string(error) + " (" + Narrow(description) + ")";
-}
+std::string Win32ErrorText(DWORD error) { return std::to_string(error) + " (" + Narrow(fw::SystemErrorText(error)) + ")"; }
 
 bool CheckStatus(LONG status, const std::string& what) {
   if (status == ERROR_SUCCESS) return true;
