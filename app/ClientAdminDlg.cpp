@@ -5,11 +5,11 @@
 #include <iterator>
 
 #include "app/AboutDlg.h"
-#include "inventory/RunningSuiteApps.h"
 #include "framework/App.h"
 #include "framework/PngResource.h"
 #include "framework/StartupTrace.h"
 #include "inventory/ClientMaporaConfigDlg.h"
+#include "inventory/RunningSuiteApps.h"
 #include "locale/KVELLocale.h"
 #include "res/resource.h"
 #include "settings/AdvancedSettings.h"

@@ -119,9 +119,8 @@ struct Mark {
 
 std::vector<Mark> ReadTrace(const std::wstring& path) {
   std::vector<Mark> marks;
-  fw::ScopedHandle file(CreateFileW(path.c_str(), GENERIC_READ,
-                                   FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE, nullptr, OPEN_EXISTING,
-                                   FILE_ATTRIBUTE_NORMAL, nullptr));
+  fw::ScopedHandle file(CreateFileW(path.c_str(), GENERIC_READ, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
+                                    nullptr, OPEN_EXISTING, FILE_ATTRIBUTE_NORMAL, nullptr));
   if (!file) return marks;
   std::string text;
   char buffer[4096];
@@ -262,8 +261,7 @@ class Run {
     }
     Sleep(kClickDelayMs);
     clicked = NowMicroseconds();
-    PostMessageW(GetParent(button), WM_COMMAND, MAKEWPARAM(IDC_ADVANCED, BN_CLICKED),
-                 reinterpret_cast<LPARAM>(button));
+    PostMessageW(GetParent(button), WM_COMMAND, MAKEWPARAM(IDC_ADVANCED, BN_CLICKED), reinterpret_cast<LPARAM>(button));
     const double deadline = clicked + kReadyTimeoutMs * 1000.0;
     while (NowMicroseconds() < deadline) {
       if (ReadyAdvancedDialog(m_processId, m_mainWindow) != nullptr) {

@@ -98,8 +98,7 @@ CString SystemErrorText(DWORD code) {
                      nullptr, code, 0, reinterpret_cast<LPWSTR>(text.Receive()), 0, nullptr);
   CString description;
   if (length > 0 && text) description.assign(text.Get(), length);
-  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r'))
-    description.pop_back();
+  while (!description.empty() && (description.back() == L'\n' || description.back() == L'\r')) description.pop_back();
   return description;
 }
 

@@ -118,7 +118,8 @@ LocaleNameCatalog LocaleNameCatalog::FromSystem() {
   WalkSupportedLocales(
       [](LANGID id, void* context) {
         LocaleIsoNames names;
-        if (ReadLocaleIsoNames(id, names)) static_cast<std::vector<LocaleIsoNames>*>(context)->push_back(std::move(names));
+        if (ReadLocaleIsoNames(id, names))
+          static_cast<std::vector<LocaleIsoNames>*>(context)->push_back(std::move(names));
         return true;
       },
       &locales);

@@ -11,7 +11,6 @@
 #include "inventory/InstallationReport.h"
 #include "settings/SuiteSettings.h"
 
-
 struct WorkstationInventory {
   std::wstring release;
   std::wstring computerName;

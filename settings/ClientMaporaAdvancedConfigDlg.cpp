@@ -141,9 +141,7 @@ LRESULT CClientMaporaAdvancedConfigDlg::OnLearnMore(NMHDR*) {
   return 0;
 }
 
-void CClientMaporaAdvancedConfigDlg::OnManagePortals(UINT, UINT, HWND) {
-  OpenPortalConnectionManager();
-}
+void CClientMaporaAdvancedConfigDlg::OnManagePortals(UINT, UINT, HWND) { OpenPortalConnectionManager(); }
 
 HBRUSH CClientMaporaAdvancedConfigDlg::OnCtlColorWarning(HDC dc, HWND control) {
   // The system's colours and brush first, then only the text turns red.

@@ -6,6 +6,4 @@ CURLTokenManager::CURLTokenManager() = default;
 
 CURLTokenManager::~CURLTokenManager() = default;
 
-bool CURLTokenManager::PortalServerSetByAdmin() {
-  return ReadPortalServerSetByAdmin();
-}
+bool CURLTokenManager::PortalServerSetByAdmin() { return ReadPortalServerSetByAdmin(); }

@@ -49,9 +49,9 @@ TEST(RegistryKey, TypedReadsRefuseOtherTypesLenientOnesDoNot) {
     const char* name;
     DWORD type;
     std::vector<BYTE> data;
-    DWORD dword;        // ReadDword: the value, or kPreset when it fails
-    std::wstring text;  // ReadString: the text, or kUntouched when it fails
-    DWORD shortValue;   // ReadUpTo4BytesOverDword
+    DWORD dword;           // ReadDword: the value, or kPreset when it fails
+    std::wstring text;     // ReadString: the text, or kUntouched when it fails
+    DWORD shortValue;      // ReadUpTo4BytesOverDword
     std::wstring anyText;  // ReadAnyValueAsText
   } rows[] = {
       {"a REG_DWORD", REG_DWORD, {'A', 0, 0, 0}, 0x41, kUntouched, 0x41, L"A"},

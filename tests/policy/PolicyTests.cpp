@@ -57,7 +57,8 @@ struct Xml {
     ComRef<IXMLDOMParseError> parseError;
     fw::ScopedBstr reason;
     if (document->load(Variant(WindowsPath(MAPORA_POLICY_DIR) + L"\\" + name), &loaded) == S_OK) return;
-    if (SUCCEEDED(document->get_parseError(parseError.Receive())) && parseError) parseError->get_reason(reason.Receive());
+    if (SUCCEEDED(document->get_parseError(parseError.Receive())) && parseError)
+      parseError->get_reason(reason.Receive());
     error = name + L": " + (reason ? reason.Get() : L"");
   }
   operator IXMLDOMNode*() const { return document.Get(); }

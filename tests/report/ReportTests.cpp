@@ -72,7 +72,9 @@ TEST(OffersAdvancedSettings, ForDesktopOrEngineInsideTheSharedProgramFolder) {
 
 // The page in a window of its own, with Engine installed, run from the build folder.
 TEST(WorkstationPage, ShowsTheReportWithItsHeadingsBoldInTheHighlightColour) {
-  struct : AdminSession { void OpenAdvancedSettings() override {} } admin;
+  struct : AdminSession {
+    void OpenAdvancedSettings() override {}
+  } admin;
   admin.m_installedProducts.engineInstalled = true;
   LoadLibraryW(L"RICHED20.DLL");
   CWnd parent(CreateWindowExW(0, L"STATIC", L"", WS_OVERLAPPEDWINDOW, 0, 0, 640, 640, 0, 0, 0, 0));

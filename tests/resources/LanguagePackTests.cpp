@@ -59,7 +59,7 @@ namespace dialog_words {
 constexpr size_t kSignature = 1;  // 0xFFFF for the extended template
 constexpr size_t kStyle = 6;      // low word
 constexpr size_t kItemCount = 8;
-constexpr size_t kMenu = 13;          // then class and caption, each a name or an ordinal
+constexpr size_t kMenu = 13;           // then class and caption, each a name or an ordinal
 constexpr size_t kFontBeforeFace = 3;  // point size, weight, italic and charset
 constexpr size_t kItemId = 10;         // a DWORD
 constexpr size_t kItemClass = 12;      // then text, then creation data

@@ -35,9 +35,8 @@ void SetValue(HKEY root, const std::wstring& path, REGSAM view, const wchar_t* n
               DWORD size) {
   HKEY key = nullptr;
   const std::string what = Narrow(path) + " " + Narrow(name ? name : L"(default)");
-  if (!CheckStatus(
-          RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr),
-          "creating " + what))
+  if (!CheckStatus(RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr),
+                   "creating " + what))
     return;
   CheckStatus(RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size), "setting " + what);
   RegCloseKey(key);
@@ -75,12 +74,15 @@ void SweepDeadScratchHives() {
     if (!running && processId != GetCurrentProcessId()) dead.push_back(name);
   }
   RegCloseKey(hives);
-  for (const std::wstring& key : dead) SHDeleteKeyW(HKEY_CURRENT_USER, (std::wstring(kScratchHives) + L"\\" + key).c_str());
+  for (const std::wstring& key : dead)
+    SHDeleteKeyW(HKEY_CURRENT_USER, (std::wstring(kScratchHives) + L"\\" + key).c_str());
 }
 
 }  // namespace
 
-std::string Win32ErrorText(DWORD error) { return std::to_string(error) + " (" + Narrow(fw::SystemErrorText(error)) + ")"; }
+std::string Win32ErrorText(DWORD error) {
+  return std::to_string(error) + " (" + Narrow(fw::SystemErrorText(error)) + ")";
+}
 
 bool CheckStatus(LONG status, const std::string& what) {
   if (status == ERROR_SUCCESS) return true;
