@@ -1,7 +1,7 @@
 // "Advanced Configuration": display language, the user experience improvement programme and
 // local-portal support. The dialog only gathers the choices; PersistAdvancedSettings writes them
-// after it closes. The one write while it is open is the removal of a stored display language
-// whose language pack has gone.
+// after it closes. While it is open it only removes a stored display language whose language pack
+// has gone, and creates the per-user portal settings key if it is missing.
 //
 // The "Learn More" link opens <host>/en/knowledgebase/techarticles/detail/38987, where <host> is
 // the REG_SZ value
