@@ -6,6 +6,8 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
+#include "framework/RegistryKey.h"
+#include "framework/ScopedHandle.h"
 #include "tests/e2e/ConsoleDriver.h"
 #include "tests/support/TestSupport.h"
 
@@ -35,28 +37,26 @@ std::string FileContent(const std::wstring& path) {
 Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kDesktop) {
   ScopedDirectory folder(ModuleFolder() + L"\\reporttool-run");
   folder.MakeDir(L".");
-  HKEY software = nullptr;
-  HKEY user = nullptr;
-  HANDLE changed = CreateEventW(nullptr, TRUE, FALSE, nullptr);
-  RegOpenKeyExW(HKEY_LOCAL_MACHINE, L"SOFTWARE", 0, KEY_NOTIFY, &software);
-  RegOpenKeyExW(HKEY_CURRENT_USER, L"", 0, KEY_NOTIFY, &user);
-  for (HKEY key : {software, user})
-    RegNotifyChangeKeyValue(key, TRUE, REG_NOTIFY_CHANGE_NAME | REG_NOTIFY_CHANGE_LAST_SET, changed, TRUE);
-  HANDLE process = Start(L"cmd /c \"cd /d \"" + folder.Path() + L"\" && set \"" + marker + L"\" && \"" +
-                         WindowsPath(MAPORA_REPORT_EXE) + L"\" " + arguments + L" >out 2>err\"");
+  const std::string command = "MaporaReport " + std::string(arguments.begin(), arguments.end());
+  // A watch that could not be set up would let any write pass unseen.
+  fw::ScopedHandle changed(CreateEventW(nullptr, TRUE, FALSE, nullptr));
+  fw::RegistryKey software, user;
+  CheckStatus(software.Open(HKEY_LOCAL_MACHINE, L"SOFTWARE", KEY_NOTIFY), "opening HKLM\\SOFTWARE to watch it");
+  CheckStatus(user.Open(HKEY_CURRENT_USER, L"", KEY_NOTIFY), "opening HKCU to watch it");
+  for (const fw::RegistryKey* key : {&software, &user})
+    CheckStatus(RegNotifyChangeKeyValue(key->Get(), TRUE, REG_NOTIFY_CHANGE_NAME | REG_NOTIFY_CHANGE_LAST_SET,
+                                        changed.Get(), TRUE),
+                "watching the registry");
+  fw::ScopedHandle process(Start(L"cmd /c \"cd /d \"" + folder.Path() + L"\" && set \"" + marker + L"\" && \"" +
+                                 WindowsPath(MAPORA_REPORT_EXE) + L"\" " + arguments + L" >out 2>err\""));
   Outcome run;
-  if (!CheckCall(process != nullptr, "starting MaporaReport " + std::string(arguments.begin(), arguments.end())))
-    return run;
-  const DWORD waited = WaitForSingleObject(process, kWaitMs);
+  if (!CheckCall(process.IsValid(), "starting " + command)) return run;
+  const DWORD waited = WaitForSingleObject(process.Get(), kWaitMs);
   const DWORD waitError = GetLastError();
-  GetExitCodeProcess(process, &run.exitCode);
-  EXPECT_EQ(waited, WAIT_OBJECT_0) << "MaporaReport " << std::string(arguments.begin(), arguments.end())
-                                   << " did not end: exit code " << run.exitCode << ", last error "
+  GetExitCodeProcess(process.Get(), &run.exitCode);
+  EXPECT_EQ(waited, WAIT_OBJECT_0) << command << " did not end: exit code " << run.exitCode << ", last error "
                                    << Win32ErrorText(waitError);
-  CloseHandle(process);
-  EXPECT_EQ(WaitForSingleObject(changed, 0), static_cast<DWORD>(WAIT_TIMEOUT)) << "registry changed by " << arguments;
-  for (HKEY key : {software, user}) RegCloseKey(key);
-  CloseHandle(changed);
+  EXPECT_EQ(WaitForSingleObject(changed.Get(), 0), static_cast<DWORD>(WAIT_TIMEOUT)) << "registry changed by " << command;
   run.standardOutput = FileContent(folder.Path() + L"\\out");
   run.standardError = FileContent(folder.Path() + L"\\err");
   run.reportFile = FileContent(folder.Path() + L"\\report.txt");
