@@ -144,12 +144,12 @@ std::wstring InSuite(const std::wstring& path) {
 // UI language and packs, user locale and packs, right-to-left switches, help file; paths in the suite relative.
 std::wstring Describe() {
   const unsigned short uiLocale = GetUILocale();  // computes the state
-  const LocaleState& s = g_localeState;
+  const LocaleState& state = g_localeState;
   std::wstring help;
   return fw::Format(L"UI %04X %s-%s %s|%s; user %04X %s-%s %s|%s; RTL %d%d%d%d; help %s", uiLocale,
-                    GetUILangIDString(), GetUICountryIDString(), InSuite(s.uiLangDir).c_str(),
-                    InSuite(s.uiLangCountryDir).c_str(), GetLocale(), GetLangIDString(), GetCountryIDString(),
-                    InSuite(s.langDir).c_str(), InSuite(s.langCountryDir).c_str(), IsRightToLeftLanguage(),
+                    GetUILangIDString(), GetUICountryIDString(), InSuite(state.uiLangDir).c_str(),
+                    InSuite(state.uiLangCountryDir).c_str(), GetLocale(), GetLangIDString(), GetCountryIDString(),
+                    InSuite(state.langDir).c_str(), InSuite(state.langCountryDir).c_str(), IsRightToLeftLanguage(),
                     IsRightToLeft(), IsRightToLeftUI(), IsTableRightToLeft(),
                     InSuite(GetLocaleHelpFile(L"Guide", help, L".CHM")).c_str());
 }

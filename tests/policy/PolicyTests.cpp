@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 #include <msxml2.h>
 
-#include <regex>
 #include <set>
 
 #include "framework/ComRef.h"
@@ -127,14 +126,6 @@ unsigned short LangId(const std::wstring& language) {
   return langId;
 }
 
-std::vector<std::wstring> Markers(const std::wstring& text) {  // printf conversions and %1 inserts
-  static const std::wregex marker(L"%(%|[-+ #0]*[0-9*]*(\\.[0-9*]+)?[hlLwzjtI36]*[diouxXcCsSeEfgGaAp]|[1-9][0-9]?|)");
-  std::vector<std::wstring> markers;
-  for (std::wsregex_iterator m(text.begin(), text.end(), marker), end; m != end; ++m)
-    if (m->str() != L"%%") markers.push_back(m->str());
-  return markers;
-}
-
 TEST(PolicyTemplate, ParsesWithTheSystemParser) {
   std::vector<std::wstring> files{L"Mapora.admx"};
   for (const auto& language : kTemplateLanguages) files.push_back(language.first + std::wstring(L"\\Mapora.adml"));
@@ -162,7 +153,7 @@ TEST(PolicyTemplate, EveryLanguageDefinesExactlyWhatTheTemplateUses) {
       for (const std::wstring& id : used) {
         const std::wstring defined = L"//p:" + kind + L"[@id='" + id + L"']";
         if (kind == L"string") {
-          EXPECT_EQ(Markers(String(adml, defined)), Markers(String(english, defined))) << id;
+          EXPECT_EQ(FormatArguments(String(adml, defined)), FormatArguments(String(english, defined))) << id;
         } else {
           EXPECT_EQ(BagOf(Strings(adml, defined + L"/*/@refId")),
                     BagOf(Strings(admx, L"//p:policy[@presentation='$(presentation." + id + L")']/p:elements/*/@id")));
@@ -261,7 +252,7 @@ TEST_P(PolicyConsole, ShowsWhatThePolicyWrote) {
   ASSERT_TRUE(WaitUntil([&] { return IsWindowVisible(Control(main, IDC_ADVANCED)) != FALSE; }));
   EXPECT_EQ(Text(main), row.title);
   Click(main, IDC_ADVANCED);
-  WindowSearch search{[&](HWND w) { return console.Shows(w) && GetDlgItem(w, IDC_LANGUAGE_LIST); }};
+  WindowSearch search{[&](HWND window) { return console.Shows(window) && GetDlgItem(window, IDC_LANGUAGE_LIST); }};
   ASSERT_TRUE(WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)); }));
   HWND list = Control(search.found, IDC_LANGUAGE_LIST);
   EXPECT_EQ(SendMessageW(list, CB_GETITEMDATA, SendMessageW(list, CB_GETCURSEL, 0, 0), 0), LRESULT{langId});

@@ -33,7 +33,7 @@ std::wstring Block(const std::wstring& heading, const std::wstring& name) {
 
 // The report's text with every emphasised run between asterisks.
 std::wstring Marked(InstallationReport report) {
-  std::sort(report.emphasis.begin(), report.emphasis.end(), [](TextRange a, TextRange b) { return a.start > b.start; });
+  std::sort(report.emphasis.begin(), report.emphasis.end(), [](TextRange first, TextRange second) { return first.start > second.start; });
   for (const auto& run : report.emphasis) report.text.insert(run.start + run.length, L"*").insert(run.start, L"*");
   return report.text;
 }

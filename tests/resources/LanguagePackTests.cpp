@@ -5,7 +5,6 @@
 #include <windows.h>
 
 #include <map>
-#include <regex>
 #include <set>
 
 #include "res/resource.h"
@@ -30,16 +29,6 @@ std::set<WORD> Ids(HMODULE module, LPCWSTR type) {
   return ids;
 }
 
-// What a text consumes, in order: printf conversions (%s, %ls, %d...), message inserts (%1 to
-// %99) and any stray %; "%%" is none.
-std::vector<std::wstring> Arguments(const std::wstring& text) {
-  static const std::wregex spec(L"%(%|[-+ #0]*[0-9*]*(\\.[0-9*]+)?([hlLwzjtI36]*[diouxXcCsSeEfgGaAp])|[1-9][0-9]?|)");
-  std::vector<std::wstring> arguments;
-  for (std::wsregex_iterator m(text.begin(), text.end(), spec), end; m != end; ++m)
-    if (m->str() != L"%%") arguments.push_back(L"%" + (m->length(3) ? m->str(3) : m->str(1)));
-  return arguments;
-}
-
 // String tables come in blocks of 16 counted strings; block n holds identifiers (n-1)*16...
 std::map<UINT, std::vector<std::wstring>> StringArguments(HMODULE module) {
   std::map<UINT, std::vector<std::wstring>> strings;
@@ -48,8 +37,10 @@ std::map<UINT, std::vector<std::wstring>> StringArguments(HMODULE module) {
     const auto* entry = reinterpret_cast<const WCHAR*>(Data(module, RT_STRING, block, &size));
     const WCHAR* const end = entry + size / sizeof(WCHAR);
     // Each entry is its length followed by that many characters.
-    for (UINT slot = 0; slot < 16 && entry < end; entry += *entry + 1, ++slot)
-      if (*entry) strings[(block - 1u) * 16u + slot] = Arguments(std::wstring(entry + 1, *entry));
+    for (UINT slot = 0; slot < 16 && entry < end; ++slot) {
+      if (*entry) strings[(block - 1u) * 16u + slot] = testing_support::FormatArguments(std::wstring(entry + 1, *entry));
+      entry += *entry + 1;
+    }
   }
   return strings;
 }
@@ -67,19 +58,19 @@ constexpr size_t kItemClass = 12;      // then text, then creation data
 
 // The control identifiers of a DLGTEMPLATEEX and its DLGITEMTEMPLATEEX entries.
 std::multiset<DWORD> ControlIds(HMODULE module, WORD dialog) {
-  namespace w = dialog_words;
+  namespace words = dialog_words;
   const auto* const start = reinterpret_cast<const WORD*>(Data(module, RT_DIALOG, dialog));
-  if (!start || start[w::kSignature] != 0xFFFF) return {};
+  if (!start || start[words::kSignature] != 0xFFFF) return {};
   auto skipName = [](const WORD* name) {
     return *name == 0xFFFF ? name + 2 : name + std::wcslen(reinterpret_cast<const wchar_t*>(name)) + 1;
   };
-  const WORD* at = skipName(skipName(skipName(start + w::kMenu)));
-  if (start[w::kStyle] & (DS_SETFONT | DS_SHELLFONT)) at = skipName(at + w::kFontBeforeFace);
+  const WORD* at = skipName(skipName(skipName(start + words::kMenu)));
+  if (start[words::kStyle] & (DS_SETFONT | DS_SHELLFONT)) at = skipName(at + words::kFontBeforeFace);
   std::multiset<DWORD> ids;
-  for (WORD item = 0; item < start[w::kItemCount]; ++item) {
+  for (WORD item = 0; item < start[words::kItemCount]; ++item) {
     at = start + ((at - start + 1) & ~1);  // each entry starts on a DWORD
-    ids.insert(MAKELONG(at[w::kItemId], at[w::kItemId + 1]));
-    at = skipName(skipName(at + w::kItemClass));
+    ids.insert(MAKELONG(at[words::kItemId], at[words::kItemId + 1]));
+    at = skipName(skipName(at + words::kItemClass));
     at += (*at + 1) / 2 + 1;  // creation data: its size in bytes, then the data
   }
   return ids;

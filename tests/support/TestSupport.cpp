@@ -6,6 +6,7 @@
 #include <shlwapi.h>
 
 #include <cstdlib>
+#include <regex>
 
 #include "framework/Strings.h"
 
@@ -149,6 +150,15 @@ bool CopyFileTo(const std::wstring& from, const std::wstring& to) {
   folder.resize(wcslen(folder.c_str()));
   CreateDirectories(folder);
   return CheckCall(CopyFileW(from.c_str(), to.c_str(), FALSE), "copying " + Narrow(from) + " to " + Narrow(to));
+}
+
+std::vector<std::wstring> FormatArguments(const std::wstring& text) {
+  static const std::wregex conversion(
+      L"%(%|[-+ #0]*[0-9*]*(\\.[0-9*]+)?([hlLwzjtI36]*[diouxXcCsSeEfgGaAp])|[1-9][0-9]?|)");
+  std::vector<std::wstring> arguments;
+  for (std::wsregex_iterator match(text.begin(), text.end(), conversion), end; match != end; ++match)
+    if (match->str() != L"%%") arguments.push_back(L"%" + (match->length(3) ? match->str(3) : match->str(1)));
+  return arguments;
 }
 
 ScopedDirectory::ScopedDirectory(std::wstring path) : path_(std::move(path)) { RemoveTree(path_); }

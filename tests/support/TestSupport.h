@@ -64,6 +64,10 @@ void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, 
 // Reads a DWORD value; false when the key or value is missing or not a DWORD (no failure).
 bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
 
+// What a format text consumes, in order: printf conversions ("%-5ls" gives "%ls"), message inserts
+// ("%1" to "%99") and any stray "%"; "%%" is none.
+std::vector<std::wstring> FormatArguments(const std::wstring& text);
+
 // A folder tree removed (recursively) when created and again when destroyed.
 class ScopedDirectory {
  public:
