@@ -36,7 +36,7 @@ ServicePackTexts ServicePackFieldTexts(const CString& name, const CString& recor
 }
 
 void LoadInstalledServicePack(CAboutDlg& about) {
-  const std::wstring desktopKey = ProductKey(kDesktopKeyBase, GetProductVersion());
+  const std::wstring desktopKey = DesktopKey();
   const ServicePackTexts texts = ServicePackFieldTexts(
       ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPDisplayName", L""),
       ReadRegistryString(HKEY_LOCAL_MACHINE, desktopKey, L"SPBuild", L""), fw::LoadString(IDS_BUILD_FORMAT));

@@ -114,14 +114,13 @@ SessionFolders ReadSessionFolders() { return {CurrentUserName(), RoamingAppDataF
 
 ReportInput ReadReportInput(const InstalledProducts& products) {
   ReportInput input;
-  input.desktopInstalled = products.desktopInstalled;
-  input.engineInstalled = products.engineInstalled;
-  input.skyloftInstalled = products.skyloftInstalled;
-  input.serverInstalled = products.serverInstalled;
-  input.desktop = ReadProductInstallInfo(ProductKind::Desktop, products.desktopKey);
-  input.engine = ReadProductInstallInfo(ProductKind::Engine, products.engineKey);
-  input.server = ReadProductInstallInfo(ProductKind::Server, products.serverKey);
-  input.skyloftInstallDir = ReadRegistryString(HKEY_LOCAL_MACHINE, products.skyloftKey, L"InstallDir", L"");
+  for (const ReportProduct& product : kReportProducts) {
+    input.*product.installed = products.*product.detected;
+    if (product.values != nullptr)
+      input.*product.values = ReadProductInstallInfo(product.kind, products.*product.key);
+    else
+      input.skyloftInstallDir = ReadRegistryString(HKEY_LOCAL_MACHINE, products.*product.key, L"InstallDir", L"");
+  }
   input.session = ReadSessionFolders();
   return input;
 }

@@ -41,6 +41,27 @@ struct ReportInput {
   SessionFolders session;
 };
 
+// The four products in report order: where detection keeps each one's key and flag, and where the
+// report input keeps them; reportName names the product in reports.
+struct ReportProduct {
+  ProductKind kind;
+  const char* reportName;
+  std::wstring InstalledProducts::*key;
+  bool InstalledProducts::*detected;
+  bool ReportInput::*installed;
+  ProductInstallInfo ReportInput::*values;  // null for Skyloft: only its installation folder counts
+};
+inline const ReportProduct kReportProducts[] = {
+    {ProductKind::Desktop, "desktop", &InstalledProducts::desktopKey, &InstalledProducts::desktopInstalled,
+     &ReportInput::desktopInstalled, &ReportInput::desktop},
+    {ProductKind::Engine, "engine", &InstalledProducts::engineKey, &InstalledProducts::engineInstalled,
+     &ReportInput::engineInstalled, &ReportInput::engine},
+    {ProductKind::Skyloft, "skyloft", &InstalledProducts::skyloftKey, &InstalledProducts::skyloftInstalled,
+     &ReportInput::skyloftInstalled, nullptr},
+    {ProductKind::Server, "server", &InstalledProducts::serverKey, &InstalledProducts::serverInstalled,
+     &ReportInput::serverInstalled, &ReportInput::server},
+};
+
 // A run of characters of the report text to show emphasised: [start, start + length).
 struct TextRange {
   size_t start = 0;

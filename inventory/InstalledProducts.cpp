@@ -143,32 +143,14 @@ bool GetInstallDir(int productIndex, std::wstring version, std::wstring& install
 }
 
 ProductInstallInfo ReadProductInstallInfo(ProductKind kind, const std::wstring& productKey) {
-  struct Field {
-    std::wstring ProductInstallInfo::*member;
-    const wchar_t* valueName;
-  };
-  // Engine keeps its installation image under another name.
-  const wchar_t* imageValue = kind == ProductKind::Engine ? L"SourceDir" : L"ImageLocation";
-  const Field fields[] = {
-      {&ProductInstallInfo::installDir, L"InstallDir"},
-      {&ProductInstallInfo::installer, L"Installer"},
-      {&ProductInstallInfo::productName, L"ProductName"},
-      {&ProductInstallInfo::imageLocation, imageValue},
-      {&ProductInstallInfo::installDate, L"InstallDate"},
-      {&ProductInstallInfo::installTime, L"InstallTime"},
-      {&ProductInstallInfo::realVersion, L"RealVersion"},
-      {&ProductInstallInfo::spNumber, L"SPNumber"},
-      {&ProductInstallInfo::spBuild, L"SPBuild"},
-      {&ProductInstallInfo::spInstaller, L"SPInstaller"},
-      {&ProductInstallInfo::spInstallDate, L"SPInstallDate"},
-      {&ProductInstallInfo::spInstallTime, L"SPInstallTime"},
-      {&ProductInstallInfo::spStatus, L"SPStatus"},
-      {&ProductInstallInfo::spDisplayName, L"SPDisplayName"},
-  };
   // A default-constructed record holds each field's default.
   ProductInstallInfo info;
-  for (const Field& field : fields)
-    info.*field.member = ReadRegistryString(HKEY_LOCAL_MACHINE, productKey, field.valueName, info.*field.member);
+  for (const InstallValue& value : kInstallValues) {
+    // Engine keeps its installation image under another name.
+    const bool engineImage = kind == ProductKind::Engine && value.member == &ProductInstallInfo::imageLocation;
+    info.*value.member = ReadRegistryString(HKEY_LOCAL_MACHINE, productKey, engineImage ? L"SourceDir" : value.valueName,
+                                            info.*value.member);
+  }
   info.productVersion = GetCoreProductVersion(info.installDir);
   return info;
 }

@@ -48,6 +48,31 @@ struct ProductInstallInfo {
   std::wstring productVersion = L"?";
 };
 
+// The installation values read from a product's key, in report order: the member, the registry
+// value it comes from (Engine keeps its image under "SourceDir" instead) and its name in reports.
+// productVersion is not among them: it comes from the core library.
+struct InstallValue {
+  std::wstring ProductInstallInfo::*member;
+  const wchar_t* valueName;
+  const char* reportName;
+};
+inline const InstallValue kInstallValues[] = {
+    {&ProductInstallInfo::installDir, L"InstallDir", "installDir"},
+    {&ProductInstallInfo::installer, L"Installer", "installer"},
+    {&ProductInstallInfo::productName, L"ProductName", "productName"},
+    {&ProductInstallInfo::imageLocation, L"ImageLocation", "imageLocation"},
+    {&ProductInstallInfo::installDate, L"InstallDate", "installDate"},
+    {&ProductInstallInfo::installTime, L"InstallTime", "installTime"},
+    {&ProductInstallInfo::realVersion, L"RealVersion", "realVersion"},
+    {&ProductInstallInfo::spNumber, L"SPNumber", "spNumber"},
+    {&ProductInstallInfo::spBuild, L"SPBuild", "spBuild"},
+    {&ProductInstallInfo::spInstaller, L"SPInstaller", "spInstaller"},
+    {&ProductInstallInfo::spInstallDate, L"SPInstallDate", "spInstallDate"},
+    {&ProductInstallInfo::spInstallTime, L"SPInstallTime", "spInstallTime"},
+    {&ProductInstallInfo::spStatus, L"SPStatus", "spStatus"},
+    {&ProductInstallInfo::spDisplayName, L"SPDisplayName", "spDisplayName"},
+};
+
 // The release the console administers: "10.5".
 std::wstring GetProductVersion();
 

@@ -1,6 +1,7 @@
 #include "report/WorkstationInventory.h"
 
 #include <nlohmann/json.hpp>
+#include <iterator>
 #include <vector>
 
 #include "framework/Strings.h"
@@ -10,33 +11,15 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-struct InstallField {
-  const char* name;
-  std::wstring ProductInstallInfo::*member;
-};
-
-// Every installation value, named as in ProductInstallInfo.
-const InstallField kInstallFields[] = {
-    {"installDir", &ProductInstallInfo::installDir},
-    {"installer", &ProductInstallInfo::installer},
-    {"productName", &ProductInstallInfo::productName},
-    {"imageLocation", &ProductInstallInfo::imageLocation},
-    {"installDate", &ProductInstallInfo::installDate},
-    {"installTime", &ProductInstallInfo::installTime},
-    {"realVersion", &ProductInstallInfo::realVersion},
-    {"spNumber", &ProductInstallInfo::spNumber},
-    {"spBuild", &ProductInstallInfo::spBuild},
-    {"spInstaller", &ProductInstallInfo::spInstaller},
-    {"spInstallDate", &ProductInstallInfo::spInstallDate},
-    {"spInstallTime", &ProductInstallInfo::spInstallTime},
-    {"spStatus", &ProductInstallInfo::spStatus},
-    {"spDisplayName", &ProductInstallInfo::spDisplayName},
-    {"productVersion", &ProductInstallInfo::productVersion},
-};
-
-Json Product(bool installed, const std::wstring& key, const ProductInstallInfo& info) {
-  Json product = {{"installed", installed}, {"registryKey", ToUtf8(key)}};
-  for (const InstallField& field : kInstallFields) product[field.name] = ToUtf8(info.*field.member);
+Json Product(const ReportProduct& entry, const std::wstring& key, const ReportInput& values) {
+  Json product = {{"installed", values.*entry.installed}, {"registryKey", ToUtf8(key)}};
+  if (entry.values == nullptr) {
+    product["installDir"] = ToUtf8(values.skyloftInstallDir);
+    return product;
+  }
+  const ProductInstallInfo& info = values.*entry.values;
+  for (const InstallValue& value : kInstallValues) product[value.reportName] = ToUtf8(info.*value.member);
+  product["productVersion"] = ToUtf8(info.productVersion);
   return product;
 }
 
@@ -52,10 +35,7 @@ WorkstationInventory ReadWorkstationInventory(const InstalledProducts& products)
   WorkstationInventory inventory;
   inventory.release = products.version;
   inventory.computerName = fw::ComputerName();
-  inventory.desktopKey = products.desktopKey;
-  inventory.engineKey = products.engineKey;
-  inventory.skyloftKey = products.skyloftKey;
-  inventory.serverKey = products.serverKey;
+  for (const ReportProduct& product : kReportProducts) inventory.productKeys.push_back(products.*product.key);
   inventory.values = ReadReportInput(products);
   inventory.settings = ReadStoredSuiteSettings(products);
   return inventory;
@@ -64,9 +44,10 @@ WorkstationInventory ReadWorkstationInventory(const InstalledProducts& products)
 std::string InventoryJson(const WorkstationInventory& inventory) {
   const ReportInput& values = inventory.values;
   const StoredSuiteSettings& settings = inventory.settings;
-  Json skyloft = {{"installed", values.skyloftInstalled},
-                  {"registryKey", ToUtf8(inventory.skyloftKey)},
-                  {"installDir", ToUtf8(values.skyloftInstallDir)}};
+  Json products = Json::object();
+  for (size_t index = 0; index < std::size(kReportProducts); ++index)
+    products[kReportProducts[index].reportName] =
+        Product(kReportProducts[index], inventory.productKeys.at(index), values);
   Json displayLanguage = {{"uiLangId", nullptr}, {"followsWindows", true}};
   if (settings.uiLangId) {
     displayLanguage["uiLangId"] = *settings.uiLangId;
@@ -80,11 +61,7 @@ std::string InventoryJson(const WorkstationInventory& inventory) {
        {{"user", ToUtf8(values.session.user)},
         {"appDataFolder", ToUtf8(values.session.appData)},
         {"tempFolder", ToUtf8(values.session.temp)}}},
-      {"products",
-       {{"desktop", Product(values.desktopInstalled, inventory.desktopKey, values.desktop)},
-        {"engine", Product(values.engineInstalled, inventory.engineKey, values.engine)},
-        {"skyloft", skyloft},
-        {"server", Product(values.serverInstalled, inventory.serverKey, values.server)}}},
+      {"products", products},
       {"settings",
        {{"displayLanguage", displayLanguage},
         {"improvementProgram", {{"enableKuei", settings.enableKuei}, {"on", settings.enableKuei != 0}}},

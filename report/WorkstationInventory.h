@@ -5,8 +5,8 @@
 
 #include <windows.h>
 
-#include <optional>
 #include <string>
+#include <vector>
 
 #include "inventory/InstallationReport.h"
 #include "settings/SuiteSettings.h"
@@ -14,10 +14,8 @@
 struct WorkstationInventory {
   std::wstring release;
   std::wstring computerName;
-  std::wstring desktopKey;
-  std::wstring engineKey;
-  std::wstring skyloftKey;
-  std::wstring serverKey;
+  // The products' registry keys, in kReportProducts' order.
+  std::vector<std::wstring> productKeys;
   // The installed flags, the products' values and the session folders, as the report has them.
   ReportInput values;
   StoredSuiteSettings settings;
