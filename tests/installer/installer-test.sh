@@ -189,6 +189,10 @@ upgrade() {
   expect "Add/Remove Programs entries after the upgrade" "$entries" 1
   expect "DisplayVersion after the upgrade" "$(reg_value "$uninstall_key" DisplayVersion)" "$version"
   expect_file "console after the upgrade" "$bin\\MaporaAdmin.exe" yes
+  msiexec /i "$(windows_path "$package")" REMOVE=Lang_de
+  expect_done "REMOVE=Lang_de"
+  expect_file "German pack after REMOVE=Lang_de" "$suite\\bin\\de\\ResMaporaAdmin.dll" no
+  expect_file "French pack after REMOVE=Lang_de" "$suite\\bin\\fr\\ResMaporaAdmin.dll" yes
 
   msiexec /i "$(windows_path "$older")"
   case $code in 67 | 102) ;; *) fail "msiexec /i older over newer exited with $code, expected 1603 or 1638 (67 or 102)" ;; esac
