@@ -6,6 +6,7 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
+#include "MaporaVersion.h"
 #include "framework/RegistryKey.h"
 #include "framework/ScopedHandle.h"
 #include "tests/e2e/ConsoleDriver.h"
@@ -140,6 +141,7 @@ TEST_F(Workstation, ExitCodesAndMessages) {
     const char* fileStart;
   } kRows[] = {{L"--json", 0, "{\n  \"release\": \"10.5\",", "", ""},
                {L"--help", 0, "Usage: MaporaReport [--json] [--out FILE]\r\n", "", ""},
+               {L"--version", 0, "MaporaReport " MAPORA_FILE_VERSION_TEXT "\r\n", "", ""},
                {L"--bogus", 2, "", "MaporaReport: unknown option --bogus\r\nUsage: ", ""},
                {L"--out", 2, "", "MaporaReport: --out needs a file name\r\nUsage: ", ""},
                {L"--out no\\r.txt", 1, "", "MaporaReport: cannot write no\\r.txt: ", ""},
