@@ -89,8 +89,6 @@ lifecycle() {
   expect_file "console" "$bin\\MaporaAdmin.exe" yes
   expect_file "report" "$bin\\MaporaReport.exe" yes
   for tag in "${packs[@]}"; do expect_file "$tag pack" "$suite\\bin\\$tag\\ResMaporaAdmin.dll" yes; done
-  expect_file "help" "$suite\\help\\administering_mapora_desktop.chm" yes
-  expect_file "French help" "$suite\\help\\fr\\administering_mapora_desktop.chm" yes
   expect_file "policy templates (off by default)" 'C:\windows\PolicyDefinitions\Mapora.admx' no
   # Wine keeps the per-user Start menu for per-machine packages; the log says which it took.
   lnk=$(sed -n 's/^Property(S): ProgramMenuFolder = \(.*\)\\$/\1/p' "$log" | tr -d '\r')
