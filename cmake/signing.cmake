@@ -57,7 +57,7 @@ function(mapora_sign_files name)
   endif()
   # The stamp is touched after the files, so a build that changed none of them signs nothing; one
   # that relinked some re-runs the script, which leaves the files it signed before alone.
-  set(stamp ${CMAKE_BINARY_DIR}/signing/${name}.stamp)
+  set(stamp ${CMAKE_CURRENT_BINARY_DIR}/${name}.signed)
   add_custom_command(OUTPUT ${stamp}
     COMMAND ${MAPORA_SIGN_SCRIPT} ${args} ${files}
     COMMAND ${CMAKE_COMMAND} -E touch ${stamp}

@@ -103,9 +103,10 @@ for f in "${files[@]}"; do
   signed=$((signed + 1))
 done
 
-if [ -n "$timestamp_url" ]; then
-  stamped="timestamped by $timestamp_url"
+if [ $signed -eq 0 ]; then
+  echo "Signing: nothing to sign, $(files_count $kept) already signed as \"$subject\""
+elif [ -n "$timestamp_url" ]; then
+  echo "Signing: signed $(files_count $signed) ($kept already signed) as \"$subject\", timestamped by $timestamp_url"
 else
-  stamped="not timestamped"
+  echo "Signing: signed $(files_count $signed) ($kept already signed) as \"$subject\", not timestamped"
 fi
-echo "Signing: signed $(files_count $signed) ($kept already signed) as \"$subject\", $stamped"
