@@ -39,12 +39,17 @@ endif()
 
 # mapora_sign_files(<target> [TARGETS <targets>...] [FILES <files>...] [DEPENDS <targets>...])
 # A target, built by default, that signs in place the outputs of TARGETS and the FILES that the
-# DEPENDS targets make (the packages). Something that ships these files depends on <target>, so it
-# takes them signed. Without a certificate the target does nothing.
+# DEPENDS targets make (the packages). A command that takes these files to ship them depends on
+# <target> and on the file <target>_STAMP names (touched once they are signed, empty without a
+# certificate), so it takes them signed. Without a certificate the target does nothing.
 function(mapora_sign_files name)
   cmake_parse_arguments(S "" "" "TARGETS;FILES;DEPENDS" ${ARGN})
+  set(${name}_STAMP "" PARENT_SCOPE)
   if(NOT MAPORA_SIGNING)
     add_custom_target(${name})
+    if(S_TARGETS OR S_DEPENDS)
+      add_dependencies(${name} ${S_TARGETS} ${S_DEPENDS})
+    endif()
     return()
   endif()
   set(files ${S_FILES})
@@ -65,4 +70,5 @@ function(mapora_sign_files name)
     COMMENT "Signing ${name}"
     VERBATIM)
   add_custom_target(${name} ALL DEPENDS ${stamp})
+  set(${name}_STAMP ${stamp} PARENT_SCOPE)
 endfunction()
