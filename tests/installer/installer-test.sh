@@ -4,9 +4,12 @@
 #   installer-test.sh lifecycle BUILD_DIR   install, what it put in place, the console and the
 #                                           report, the optional feature, repair, uninstall
 #   installer-test.sh upgrade BUILD_DIR     two languages chosen, major upgrade, downgrade refused
+#   installer-test.sh signed BUILD_DIR PACKAGE   a signed package (tests/signing) installs with its
+#                                           signed programs, which run, and uninstalls
 #
-# BUILD_DIR is the x64 tree; its Xvfb display (fixture "wine") shows the console. Every failed
-# check prints what it found and what it expected; the exit code is the number of failures.
+# BUILD_DIR is the x64 tree, PACKAGE an x64 package (by default the tree's own); the tree's Xvfb
+# display (fixture "wine") shows the console. Every failed check prints what it found and what it
+# expected; the exit code is the number of failures.
 set -uo pipefail
 scenario=$1
 build=$(cd "$2" && pwd)
@@ -50,7 +53,7 @@ reg_value() {
 property() { msiinfo export "$1" Property | tr -d '\r' | awk -F'\t' -v name="$2" '$1 == name { print $2 }'; }
 
 version=$(sed -n 's/^project(MaporaAdmin VERSION \([0-9.]*\).*/\1/p' "$source_dir/CMakeLists.txt")
-package="$build/installer/MaporaAdmin-$version-x64.msi"
+package=${3:-$build/installer/MaporaAdmin-$version-x64.msi}
 [ -f "$package" ] || { echo "FAILED: $package has not been built" >&2; exit 1; }
 product_code=$(property "$package" ProductCode)
 uninstall_key="HKLM\\SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\$product_code"
@@ -74,6 +77,12 @@ snapshot() {
   done | grep -v -E '^\[HKEY_LOCAL_MACHINE\\(HARDWARE|System\\CurrentControlSet\\(Control\\(Session Manager|TimeZoneInformation|DeviceClasses)|Enum|Services\\EventLog))' |
     grep -v -E '^\[HKEY_CURRENT_USER\\(Volatile Environment|Software\\Wine\\(Fonts|MSIMM))'
   (cd "$WINEPREFIX/drive_c" && find . | grep -v -E '^\./(windows/temp|users/[^/]+/Temp|windows/logs)(/|$)' | sort)
+}
+
+expect_report_runs() {
+  local json
+  json=$(wine "$bin\\MaporaReport.exe" --json </dev/null 2>/dev/null | head -c 1)
+  expect "installed MaporaReport --json, first character" "$json" "{"
 }
 
 lifecycle() {
@@ -102,9 +111,7 @@ lifecycle() {
   [ -n "$icon" ] && expect_file "Add/Remove Programs icon" "$icon" yes
 
   # The installed programs run: the report prints its JSON, the console shows its window.
-  local json
-  json=$(wine "$bin\\MaporaReport.exe" --json </dev/null 2>/dev/null | head -c 1)
-  expect "installed MaporaReport --json, first character" "$json" "{"
+  expect_report_runs
   wine "$bin\\MaporaAdmin.exe" </dev/null >/dev/null 2>&1 &
   local shown=no
   for _ in $(seq 1 60); do
@@ -187,6 +194,22 @@ upgrade() {
   grep -q 'A newer version of Mapora Administrator is already installed' "$log" ||
     fail "the downgrade's log ($log) does not give the reason 'A newer version of Mapora Administrator is already installed'"
   expect "DisplayVersion after the refused downgrade" "$(reg_value "$uninstall_key" DisplayVersion)" "$version"
+}
+
+signed() {
+  msiexec /i "$(windows_path "$package")"
+  expect_done "/i signed package"
+  local files=("$bin\\MaporaAdmin.exe" "$bin\\MaporaReport.exe") tag f has
+  for tag in "${packs[@]}"; do files+=("$suite\\bin\\$tag\\ResMaporaAdmin.dll"); done
+  for f in "${files[@]}"; do
+    has=no
+    osslsigncode extract-signature -in "$(unix_path "$f")" -out "$work/signature" >/dev/null 2>&1 && has=yes
+    rm -f "$work/signature"
+    expect "$f installed with its signature" "$has" yes
+  done
+  expect_report_runs
+  msiexec /x "$(windows_path "$package")"
+  expect_done "/x signed package"
 }
 
 "$scenario"
