@@ -15,7 +15,8 @@ scenario=$1
 build=$(cd "$2" && pwd)
 source_dir=$(cd "$(dirname "$0")/../.." && pwd)
 work="$build/installer-tests/$scenario"
-export WINEPREFIX="$work/prefix" WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml="
+# No menu builder: it would put the shortcut's menu entries into this machine's own desktop.
+export WINEPREFIX="$work/prefix" WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml=;winemenubuilder.exe=d"
 DISPLAY=$(cat "$build/wine-display") && export DISPLAY
 
 failures=0
@@ -33,6 +34,7 @@ unix_path() { local p=${1#[Cc]:}; echo "$WINEPREFIX/drive_c${p//\\//}"; }
 windows_path() { echo "Z:$(realpath -m "$1" | tr / '\\')"; }
 
 # msiexec ARGS...: runs it quietly with a verbose log (next to the prefix), sets $code and $log.
+# Wine passes the exit code on modulo 256: 1603 arrives as 67, 1638 as 102.
 run=0
 msiexec() {
   run=$((run + 1))
@@ -66,16 +68,16 @@ wineboot -i </dev/null >/dev/null 2>&1 || { echo "FAILED: wineboot could not cre
 
 # The registry and the file tree as a sorted listing. Left out, as Wine itself changes them
 # whatever the package does: the temporary folders; Wine's per-run state (the time zone,
-# device and session keys under System, the volatile HARDWARE tree); the installer's cache
-# folder of Wine's own (Installer\*.msi is checked apart); the last-write timestamps of keys.
+# device, service and session keys under System, the volatile HARDWARE tree, the font and input
+# caches and the session's mouse parameters under Software\Wine); the last-write timestamps.
 snapshot() {
   local hive
   for hive in HKLM HKCU; do
     wine reg export "$hive" "$(windows_path "$work/$hive.reg")" /y </dev/null >/dev/null 2>&1
     iconv -f UTF-16 -t UTF-8 "$work/$hive.reg" | tr -d '\r' | grep -v '^#time=' |
       awk '/^\[/ { key = $0 } !/^\[/ && NF { print key " " $0 } /^\[/ { print }'
-  done | grep -v -E '^\[HKEY_LOCAL_MACHINE\\(HARDWARE|System\\CurrentControlSet\\(Control\\(Session Manager|TimeZoneInformation|DeviceClasses)|Enum|Services\\EventLog))' |
-    grep -v -E '^\[HKEY_CURRENT_USER\\(Volatile Environment|Software\\Wine\\(Fonts|MSIMM))'
+  done | grep -v -E '^\[HKEY_LOCAL_MACHINE\\(HARDWARE|System\\CurrentControlSet\\(Control\\(Session Manager|TimeZoneInformation|DeviceClasses|ServiceCurrent)|Enum|Services\\EventLog))' |
+    grep -v -E '^\[HKEY_CURRENT_USER\\(Volatile Environment|Software\\Wine\\(Fonts|MSIMM|Temporary System Parameters))'
   (cd "$WINEPREFIX/drive_c" && find . | grep -v -E '^\./(windows/temp|users/[^/]+/Temp|windows/logs)(/|$)' | sort)
 }
 
@@ -105,10 +107,12 @@ lifecycle() {
   expect "Add/Remove Programs Publisher" "$(reg_value "$uninstall_key" Publisher)" "Kvel"
   expect "Add/Remove Programs DisplayVersion" "$(reg_value "$uninstall_key" DisplayVersion)" "$version"
   expect "Add/Remove Programs HelpLink" "$(reg_value "$uninstall_key" HelpLink)" "https://support.kvel.example"
+  # Add/Remove Programs shows the icon that the product's registration names.
   local icon
-  icon=$(reg_value "$uninstall_key" DisplayIcon)
-  expect "Add/Remove Programs DisplayIcon names" "${icon##*\\}" "MaporaAdmin.ico"
-  [ -n "$icon" ] && expect_file "Add/Remove Programs icon" "$icon" yes
+  icon=$(wine reg query 'HKLM\Software\Classes\Installer\Products' /s /v ProductIcon </dev/null 2>/dev/null |
+    tr -d '\r' | sed -n 's/^ *ProductIcon *REG_SZ *//p')
+  expect "product icon's file name" "${icon##*\\}" "MaporaAdmin.ico"
+  [ -n "$icon" ] && expect_file "product icon" "$icon" yes
 
   # The installed programs run: the report prints its JSON, the console shows its window.
   expect_report_runs
@@ -128,10 +132,11 @@ lifecycle() {
   expect_file "ADMX" 'C:\windows\PolicyDefinitions\Mapora.admx' yes
   expect_file "Japanese ADML" 'C:\windows\PolicyDefinitions\ja-JP\Mapora.adml' yes
 
-  # Repair brings a deleted program back.
+  # Repair brings a deleted program back. Wine's msiexec does not implement /f, so the repair
+  # is asked for by the properties /fa stands for.
   rm -f "$(unix_path "$bin\\MaporaAdmin.exe")"
-  msiexec /fa "$(windows_path "$package")"
-  expect_done "/fa"
+  msiexec /i "$(windows_path "$package")" REINSTALL=ALL REINSTALLMODE=a
+  expect_done "REINSTALL=ALL REINSTALLMODE=a (/fa)"
   expect_file "console after repair" "$bin\\MaporaAdmin.exe" yes
 
   # What users and policies write belongs to the suite and stays; everything else goes.
@@ -152,10 +157,13 @@ lifecycle() {
     expect "$key\\$name after uninstall" "$(reg_value "$key" "$name")" "$(printf '0x%x' "$value")"
   done
   snapshot > "$work/after.txt"
-  # Apart from the kept values and the keys that hold them, nothing differs.
+  # Apart from the kept values and the keys that hold them, nothing differs. Wine leaves the
+  # installer's own registration keys, empty, and its cache folder, which Windows always has.
   local diffs
   diffs=$(diff "$work/before.txt" "$work/after.txt" | grep '^[<>]' |
-    grep -v -E '^> \[HKEY_(LOCAL_MACHINE\\Software|CURRENT_USER\\Software)\\KVEL(\\Desktop10\.5(\\Settings)?|\\Mapora Connection(\\Settings)?)?\]' |
+    grep -v -E '^> \[HKEY_LOCAL_MACHINE\\Software\\(Classes\\Installer|Microsoft\\Windows\\CurrentVersion\\Installer)(\\[^]]*)?\]$' |
+    grep -v -x -F '> ./windows/Installer' |
+    grep -v -i -E '^> \[HKEY_(LOCAL_MACHINE\\Software|CURRENT_USER\\Software)\\KVEL(\\Desktop10\.5(\\Settings)?|\\Mapora Connection(\\Settings)?)?\]$' |
     grep -v -E '"(UILANGID|EnableKUEI|Support Local Portal|Portal Server Set By Admin)"=dword')
   expect "registry and files after uninstall, against before install" "$diffs" ""
 }
@@ -190,9 +198,14 @@ upgrade() {
   expect_file "console after the upgrade" "$bin\\MaporaAdmin.exe" yes
 
   msiexec /i "$(windows_path "$older")"
-  case $code in 1603 | 1638) ;; *) fail "msiexec /i older over newer exited with $code, expected 1603 or 1638" ;; esac
-  grep -q 'A newer version of Mapora Administrator is already installed' "$log" ||
-    fail "the downgrade's log ($log) does not give the reason 'A newer version of Mapora Administrator is already installed'"
+  case $code in 67 | 102) ;; *) fail "msiexec /i older over newer exited with $code, expected 1603 or 1638 (67 or 102)" ;; esac
+  # Wine logs no message box text under /qn: the log shows the newer product found and the launch
+  # condition that stops on it, and the package carries the message Windows shows.
+  local found
+  found=$(sed -n 's/^Property(S): WIX_DOWNGRADE_DETECTED = \(.*\)$/\1/p' "$log" | tr -d '\r')
+  expect "newer product found by the older package (log $log)" "$found" "$product_code"
+  expect "the older package's launch condition" "$(msiinfo export "$older" LaunchCondition | tr -d '\r' | tail -n 1)" \
+    "NOT WIX_DOWNGRADE_DETECTED	A newer version of Mapora Administrator is already installed. To install this version, first uninstall the newer one."
   expect "DisplayVersion after the refused downgrade" "$(reg_value "$uninstall_key" DisplayVersion)" "$version"
 }
 
