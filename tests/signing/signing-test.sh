@@ -1,15 +1,14 @@
 #!/usr/bin/env bash
-# Signs copies of a build's shipped files through the build's own signing script, with a
-# certificate authority made here and thrown away, and checks what Windows would check.
+# Signs copies of both trees' shipped files through the build's own scripts, in the order a signing
+# build follows (programs and packs, the package built from them, the package), with a certificate
+# authority made here and thrown away, and checks what Windows would check.
 #
-#   signing-test.sh programs SCRATCH_DIR BUILD_SIGNS(ON|OFF) X64_FILES... -- X86_TREE
-#       the programs and packs of both trees
-#   signing-test.sh packages SCRATCH_DIR VERSION X64_TREE X86_TREE
-#       both packages as a signing build makes them: programs and packs signed, packaged, the
-#       package signed; the x64 one stays in SCRATCH_DIR for the installation under Wine
+#   signing-test.sh SCRATCH_DIR VERSION BUILD_SIGNS(ON|OFF) X64_TREE X86_TREE
+#
+# The signed x64 package stays in SCRATCH_DIR for the installation under Wine.
 set -uo pipefail
-mode=$1 scratch=$2
-shift 2
+scratch=$1 version=$2 build_signs=$3
+declare -A tree=([x64]=$4 [x86]=$5)
 source_dir=$(cd "$(dirname "$0")/../.." && pwd)
 failures=0
 fail() { printf 'FAIL: %s\n  expected: %s\n  got: %s\n' "$1" "$2" "$3"; failures=$((failures + 1)); }
@@ -55,81 +54,67 @@ verify() {
   [ $verdict = "$3" ] || fail "$1: $2" "verification: $3" "verification: $verdict, osslsigncode said:"$'\n'"$log"
 }
 
-programs() {
-  local build_signs=$1 built=() files=() f i=0
-  shift
-  while [ "$1" != "--" ]; do built+=("$1") && shift; done
-  built+=("$2"/app/MaporaAdmin.exe "$2"/report/MaporaReport.exe "$2"/packs/*/ResMaporaAdmin.dll)
-  # Copies named by the end of their path in the build (unsigned/ keeps them as they were built).
-  mkdir unsigned
-  for f in "${built[@]}"; do
-    cp "$f" "unsigned/$i-$(rev <<<"$f" | cut -d/ -f1-4 | rev | tr / -)" || fail "a shipped file" "$f" "none"
-    i=$((i + 1))
-  done
-  cp -r unsigned signed && files=(signed/*)
-  local n=${#files[@]} one=${files[0]}
+# Copies of the files each tree's package is built from; un/ keeps them as they were built.
+files=()
+for arch in x64 x86; do
+  cp -r "${tree[$arch]}/installer/staging" $arch || fail "the $arch tree's staged files" "a folder" "none"
+  while read -r rel; do files+=("$arch/$rel"); done <"${tree[$arch]}/installer/staged-pe-files.txt"
+done
+mkdir un && cp -r x64 x86 un/
+n=${#files[@]} one=${files[0]}
 
-  run "no certificate" 0 "nothing signed: $n files left unsigned" -- "${files[@]}"
-  run "wrong password" 1 "cannot open signer.p12 \(wrong password" MAPORA_SIGN_PKCS12=signer.p12 \
-    MAPORA_SIGN_PASSWORD=wrong -- "$one"
-  f=$(diff -r unsigned signed) || fail "files without a certificate or its password" "left unsigned" "$f"
+run "no certificate" 0 "nothing signed: $n files left unsigned" -- "${files[@]}"
+run "wrong password" 1 "cannot open signer.p12 \(wrong password" MAPORA_SIGN_PKCS12=signer.p12 \
+  MAPORA_SIGN_PASSWORD=wrong -- "$one"
+for arch in x64 x86; do
+  f=$(diff -r un/$arch $arch) || fail "$arch files without a certificate or its password" "left unsigned" "$f"
+done
 
-  # No time-stamping server answers here: the files are signed all the same, and the report says so.
-  run "first signing" 0 \
-    "^Signing: signed $n files \(0 already signed\) as \"CN = Throwaway Publisher, O = Test\", not timestamped$" \
-    "${key[@]}" MAPORA_SIGN_TIMESTAMP_URL=http://127.0.0.1:9/ -- "${files[@]}"
-  grep -q "warning: the time-stamping server http://127.0.0.1:9/ did not answer" <<<"$out" ||
-    fail "first signing: the unanswered time-stamping server" "a warning naming it" "$out"
-  for f in "${files[@]}"; do verify "signed" "$f" pass; done
+# No time-stamping server answers here: the files are signed all the same, and the report says so.
+run "first signing" 0 \
+  "^Signing: signed $n files \(0 already signed\) as \"CN = Throwaway Publisher, O = Test\", not timestamped$" \
+  "${key[@]}" MAPORA_SIGN_TIMESTAMP_URL=http://127.0.0.1:9/ -- "${files[@]}"
+grep -q "warning: the time-stamping server http://127.0.0.1:9/ did not answer" <<<"$out" ||
+  fail "first signing: the unanswered time-stamping server" "a warning naming it" "$out"
+for f in "${files[@]}"; do verify "signed" "$f" pass; done
 
-  # Nothing relinked: nothing signed again. One file relinked: that one alone.
-  cp -r signed before
-  run "nothing changed" 0 "nothing to sign, $n files already signed" "${key[@]}" -- "${files[@]}"
-  f=$(diff -r before signed) || fail "nothing changed" "every file left as it was" "$f"
-  cp "un$one" "$one"
-  run "one file relinked" 0 "signed 1 file \($((n - 1)) already signed\)" "${key[@]}" -- "${files[@]}"
-  verify "relinked and signed again" "$one" pass
+# Nothing relinked: nothing signed again. One file relinked: that one alone.
+mkdir before && cp -r x64 x86 before/
+run "nothing changed" 0 "nothing to sign, $n files already signed" "${key[@]}" -- "${files[@]}"
+f=$(diff -r before/x64 x64 && diff -r before/x86 x86) || fail "nothing changed" "every file left as it was" "$f"
+cp "un/$one" "$one"
+run "one file relinked" 0 "signed 1 file \($((n - 1)) already signed\)" "${key[@]}" -- "${files[@]}"
+verify "relinked and signed again" "$one" pass
 
-  # One byte changed halfway into the program, where the signature covers it.
-  local at byte
-  for f in "${files[@]}"; do
-    cp "$f" "$f.tampered"
-    at=$(($(stat -c %s "un$f") / 2)) && byte=$(od -An -tu1 -j $at -N1 "$f")
-    printf "\\$(printf %03o $(((byte + 1) % 256)))" | dd of="$f.tampered" bs=1 seek=$at conv=notrunc status=none
-    verify "one byte changed at $at" "$f.tampered" fail
-  done
+# One byte changed halfway into the program, where the signature covers it.
+for f in "${files[@]}"; do
+  at=$(($(stat -c %s "un/$f") / 2)) && byte=$(od -An -tu1 -j $at -N1 "$f") && cp "$f" tampered
+  printf "\\$(printf %03o $(((byte + 1) % 256)))" | dd of=tampered bs=1 seek=$at conv=notrunc status=none
+  verify "$f with one byte changed at $at" tampered fail
+done
 
-  # The build's own files carry a signature exactly when the build was given a certificate.
-  local want=no has
-  [ "$build_signs" = ON ] && want=yes
-  for f in "${built[@]}"; do
-    has=no && osslsigncode extract-signature -in "$f" -out sig >log 2>&1 && has=yes && rm sig
-    [ $has = $want ] || fail "$f carries a signature" "$want (the build signs: $build_signs)" "$has: $(cat log)"
-  done
-}
+# Each package built from the signed files, then signed: it and every program and pack inside.
+for arch in x64 x86; do
+  package=MaporaAdmin-$version-$arch.msi
+  cmake -DSTAGING_DIR=$arch -DARCH=$arch -DVERSION="$version" -DOUTPUT="$package" \
+    -P "$source_dir/installer/BuildPackage.cmake" >log 2>&1 || fail "the $arch package" "built" "$(cat log)"
+  run "$arch package" 0 "signed 1 file \(0 already signed\)" "${key[@]}" -- "$package"
+  verify "$arch package" "$package" pass
+  msiextract -C "$arch-inside" "$package" >/dev/null 2>&1
+  inside=$(find "$arch-inside" -name '*.exe' -o -name '*.dll')
+  [ "$(wc -l <<<"$inside")" -eq "$(wc -l <"${tree[$arch]}/installer/staged-pe-files.txt")" ] ||
+    fail "$arch package's programs and packs" "those of $arch/" "$inside"
+  for f in $inside; do verify "$arch package, inside" "$f" pass; done
+done
 
-packages() {
-  local version=$1 arch tree pe rel package f inside
-  shift
-  for arch in x64 x86; do
-    tree=$1 && shift && cp -r "$tree/installer/staging" $arch || fail "$arch staging folder" "$tree" "none"
-    pe=() && while read -r rel; do pe+=("$arch/$rel"); done <"$tree/installer/staged-pe-files.txt"
-    package=MaporaAdmin-$version-$arch.msi
-    run "$arch programs and packs" 0 "signed ${#pe[@]} files" "${key[@]}" -- "${pe[@]}"
-    cmake -DSTAGING_DIR=$arch -DARCH=$arch -DVERSION="$version" -DOUTPUT="$package" \
-      -P "$source_dir/installer/BuildPackage.cmake" >log 2>&1 || fail "$arch package" "built" "$(cat log)"
-    run "$arch package" 0 "signed 1 file \(0 already signed\)" "${key[@]}" -- "$package"
-    verify "$arch package" "$package" pass
+# The x64 tree's own staged files and package carry a signature exactly when it signs.
+want=no && [ "$build_signs" = ON ] && want=yes
+while read -r f; do
+  has=no && osslsigncode extract-signature -in "$f" -out sig >log 2>&1 && has=yes && rm sig
+  [ $has = $want ] || fail "the build's $f signed" "$want (the build signs: $build_signs)" "$has: $(cat log)"
+done < <(sed "s|^|${tree[x64]}/installer/staging/|" "${tree[x64]}/installer/staged-pe-files.txt"
+  echo "${tree[x64]}/installer/MaporaAdmin-$version-x64.msi")
 
-    # What the package installs: every program and pack, each signed.
-    msiextract -C "$arch-inside" "$package" >/dev/null 2>&1
-    inside=$(find "$arch-inside" -name '*.exe' -o -name '*.dll')
-    [ "$(wc -l <<<"$inside")" -eq ${#pe[@]} ] || fail "$arch package holds" "${pe[*]}" "$inside"
-    for f in $inside; do verify "$arch package, inside" "$f" pass; done
-  done
-}
-
-"$mode" "$@"
 grep -F -m 3 "$password" commands.log && fail "command lines (what ps shows)" "no password" "the lines above"
-echo "$mode: $failures failures"
+echo "$n files and 2 packages signed and checked, $failures failures"
 [ $failures -eq 0 ]
