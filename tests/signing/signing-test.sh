@@ -28,8 +28,8 @@ key=(MAPORA_SIGN_PKCS12=signer.p12 MAPORA_SIGN_PASSWORD="$password")
 
 # osslsigncode and openssl through wrappers that log their command lines: what ps would show.
 for tool in osslsigncode openssl; do
-  printf '#!/bin/sh\necho "$0 $*" >>"%s/commands.log"\nexec %s "$@"\n' "$scratch" "$(command -v $tool)" >bin/$tool
-  chmod +x bin/$tool
+  printf '#!/bin/sh\necho "$0 $*" >>"%s/commands.log"\nexec %s "$@"\n' "$scratch" "$(command -v $tool)" >bin/$tool &&
+    chmod +x bin/$tool
 done
 export PATH="$scratch/bin:$PATH"
 
@@ -66,9 +66,7 @@ n=${#files[@]} one=${files[0]}
 run "no certificate" 0 "nothing signed: $n files left unsigned" -- "${files[@]}"
 run "wrong password" 1 "cannot open signer.p12 \(wrong password" MAPORA_SIGN_PKCS12=signer.p12 \
   MAPORA_SIGN_PASSWORD=wrong -- "$one"
-for arch in x64 x86; do
-  f=$(diff -r un/$arch $arch) || fail "$arch files without a certificate or its password" "left unsigned" "$f"
-done
+f=$(diff -r un/x64 x64 && diff -r un/x86 x86) || fail "without a certificate or its password" "unsigned files" "$f"
 
 # No time-stamping server answers here: the files are signed all the same, and the report says so.
 run "first signing" 0 \
@@ -84,7 +82,6 @@ run "nothing changed" 0 "nothing to sign, $n files already signed" "${key[@]}" -
 f=$(diff -r before/x64 x64 && diff -r before/x86 x86) || fail "nothing changed" "every file left as it was" "$f"
 cp "un/$one" "$one"
 run "one file relinked" 0 "signed 1 file \($((n - 1)) already signed\)" "${key[@]}" -- "${files[@]}"
-verify "relinked and signed again" "$one" pass
 
 # One byte changed halfway into the program, where the signature covers it.
 for f in "${files[@]}"; do
