@@ -23,7 +23,9 @@ here=$(cd "$(dirname "$0")" && pwd)
 root=$(dirname "$here")
 
 export WINEPREFIX="${MAPORA_WORKSTATION_PREFIX:-$root/build/workstation/prefix}"
-export WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml="
+# No menu builder: the package's Start-menu shortcut would otherwise land in this machine's own
+# desktop menus.
+export WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml=;winemenubuilder.exe=d"
 
 # --- Workstation layout (Windows paths) -----------------------------------------------------
 PROGRAM_FILES_X86='C:\Program Files (x86)'
@@ -144,20 +146,18 @@ step_portal_manager() {
 # administrators install them. The same version already installed is reinstalled from the new
 # package, every file overwritten, so that a rebuilt console replaces the one in the prefix.
 step_console() {
-  local package log code
+  local package log code mode=() doing=Installing
   package="$BUILD/installer/$(cat "$(built installer/package-name.txt)")"
   [ -f "$package" ] || die "$package is missing; build the x64 tree first (cmake --build --preset x64)"
   log="$WINEPREFIX/../msiexec.log"
   code=$(package_product_code "$package")
   if wine_quiet reg query "HKLM\\SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\$code"; then
-    echo "Reinstalling $(basename "$package")"
-    wine_quiet msiexec /i "$(windows_path "$package")" REINSTALL=ALL REINSTALLMODE=vamus /qn /l*v "$(windows_path "$log")" ||
-      die "reinstalling $package failed; see $log"
-  else
-    echo "Installing $(basename "$package")"
-    wine_quiet msiexec /i "$(windows_path "$package")" /qn /l*v "$(windows_path "$log")" ||
-      die "installing $package failed; see $log"
+    mode=(REINSTALL=ALL REINSTALLMODE=vamus)
+    doing=Reinstalling
   fi
+  echo "$doing $(basename "$package")"
+  wine_quiet msiexec /i "$(windows_path "$package")" "${mode[@]}" /qn /l*v "$(windows_path "$log")" ||
+    die "$doing $package failed; see $log"
 }
 
 # The products' own copies of the language packs in their bin folders, which Advanced Configuration
