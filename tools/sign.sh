@@ -76,7 +76,7 @@ sign_one() {
   [ -n "$ts" ] && args+=(-ts "$ts")
   rm -f "$out"
   if log=$(printf '%s' "$MAPORA_SIGN_PASSWORD" | osslsigncode "${args[@]}" -in "$in" -out "$out" 2>&1); then
-    mv -f "$out" "$in"
+    chmod --reference="$in" "$out" && mv -f "$out" "$in"
     return 0
   fi
   rm -f "$out"
