@@ -69,15 +69,16 @@ wineboot -i </dev/null >/dev/null 2>&1 || { echo "FAILED: wineboot could not cre
 
 # The registry and the file tree as a sorted listing. Left out, as Wine itself changes them
 # whatever the package does: the temporary folders; Wine's per-run state (the time zone,
-# device, service and session keys under System, the volatile HARDWARE tree, the font and input
-# caches and the session's mouse parameters under Software\Wine); the last-write timestamps.
+# device, display, service and session keys under System, the volatile HARDWARE tree, the
+# network cards it lists at each session start, the font and input caches and the session's
+# mouse parameters under Software\Wine); the last-write timestamps.
 snapshot() {
   local hive
   for hive in HKLM HKCU; do
     wine reg export "$hive" "$(windows_path "$work/$hive.reg")" /y </dev/null >/dev/null 2>&1
     iconv -f UTF-16 -t UTF-8 "$work/$hive.reg" | tr -d '\r' | grep -v '^#time=' |
       awk '/^\[/ { key = $0 } !/^\[/ && NF { print key " " $0 } /^\[/ { print }'
-  done | grep -v -E '^\[HKEY_LOCAL_MACHINE\\(HARDWARE|System\\CurrentControlSet\\(Control\\(Session Manager|TimeZoneInformation|DeviceClasses|ServiceCurrent)|Enum|Services\\EventLog))' |
+  done | grep -v -E '^\[HKEY_LOCAL_MACHINE\\(HARDWARE|System\\CurrentControlSet\\(Control\\(Session Manager|TimeZoneInformation|DeviceClasses|ServiceCurrent|Class|Video)|Enum|Services\\EventLog)|Software\\(Wow6432Node\\)?Microsoft\\Windows NT\\CurrentVersion\\NetworkCards)' |
     grep -v -E '^\[HKEY_CURRENT_USER\\(Volatile Environment|Software\\Wine\\(Fonts|MSIMM|Temporary System Parameters))'
   (cd "$WINEPREFIX/drive_c" && find . | grep -v -E '^\./(windows/temp|users/[^/]+/Temp|windows/logs)(/|$)' | sort)
 }
@@ -114,6 +115,7 @@ lifecycle() {
   json=$(wine "$bin\\MaporaReport.exe" --json </dev/null 2>/dev/null | head -c 1)
   expect "installed MaporaReport --json, first character" "$json" "{"
   wine "$bin\\MaporaAdmin.exe" </dev/null >/dev/null 2>&1 &
+  local console=$!
   local shown=no
   for _ in $(seq 1 60); do
     xwininfo -root -tree 2>/dev/null | grep -q '"Mapora Administrator"' && { shown=yes; break; }
@@ -121,6 +123,11 @@ lifecycle() {
   done
   expect "installed console's window shown" "$shown" yes
   wine taskkill /f /im MaporaAdmin.exe </dev/null >/dev/null 2>&1
+  for _ in $(seq 1 20); do kill -0 "$console" 2>/dev/null || break; sleep 0.5; done
+  if kill -0 "$console" 2>/dev/null; then
+    fail "installed console: still running 10 s after taskkill, expected it ended"
+    wineserver -k 2>/dev/null
+  fi
   wait
 
   # The optional feature on request, in maintenance mode.
@@ -193,6 +200,10 @@ upgrade() {
   expect "Add/Remove Programs entries after the upgrade" "$entries" 1
   expect "DisplayVersion after the upgrade" "$(reg_value "$uninstall_key" DisplayVersion)" "$version"
   expect_file "console after the upgrade" "$bin\\MaporaAdmin.exe" yes
+  msiexec /i "$(windows_path "$package")" REMOVE=Lang_de
+  expect_done "REMOVE=Lang_de"
+  expect_file "German pack after REMOVE=Lang_de" "$suite\\bin\\de\\ResMaporaAdmin.dll" no
+  expect_file "French pack after REMOVE=Lang_de" "$suite\\bin\\fr\\ResMaporaAdmin.dll" yes
 
   msiexec /i "$(windows_path "$older")"
   case $code in 67 | 102) ;; *) fail "msiexec /i older over newer exited with $code, expected 1603 or 1638 (67 or 102)" ;; esac

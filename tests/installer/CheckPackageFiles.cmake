@@ -1,8 +1,10 @@
-# cmake -DPACKAGE=<file.msi> -DEXPECTED=PE32|PE32+ -DWORK_DIR=<folder> -P CheckPackageMachines.cmake
-# Fails unless every program and library in the package is of the expected kind, and all of them
-# are there (two programs, one pack per language): a package built from the other tree's files, or
-# with one file taken from there, would install and then not load.
-foreach(var PACKAGE EXPECTED WORK_DIR)
+# cmake -DPACKAGE=<file.msi> -DEXPECTED=PE32|PE32+ -DFILE_VERSION=<a.b.c.d> -DWORK_DIR=<folder>
+#       -P CheckPackageFiles.cmake
+# Fails unless every program and library in the package is of the expected kind and carries the
+# project's file version, and all of them are there (two programs, one pack per language): a
+# package built from the other tree's files, or with one file taken from there, would install and
+# then not load; a file left at another version would not be replaced by an upgrade.
+foreach(var PACKAGE EXPECTED FILE_VERSION WORK_DIR)
   if(NOT ${var})
     message(FATAL_ERROR "-D${var}=... is required")
   endif()
@@ -43,9 +45,11 @@ foreach(file ${files})
   else()
     set(kind "no PE image (magic ${magic})")
   endif()
-  if(NOT kind STREQUAL EXPECTED)
+  file(STRINGS "${file}" versions ENCODING UTF-16LE REGEX "^[0-9]+\\.[0-9]+\\.[0-9]+\\.[0-9]+$")
+  list(REMOVE_DUPLICATES versions)
+  if(NOT kind STREQUAL EXPECTED OR NOT versions STREQUAL FILE_VERSION)
     file(RELATIVE_PATH name "${WORK_DIR}" "${file}")
-    string(APPEND wrong "\n  ${name}: ${kind}")
+    string(APPEND wrong "\n  ${name}: ${kind}, version ${versions}")
   endif()
 endforeach()
 list(LENGTH files count)
@@ -53,6 +57,6 @@ if(NOT count EQUAL 8)
   message(SEND_ERROR "${PACKAGE}: ${count} programs and libraries, expected 8 (2 programs, 6 language packs)")
 endif()
 if(wrong)
-  message(FATAL_ERROR "${PACKAGE}: expected only ${EXPECTED} files, found:${wrong}")
+  message(FATAL_ERROR "${PACKAGE}: expected only ${EXPECTED} files of version ${FILE_VERSION}, found:${wrong}")
 endif()
 file(REMOVE_RECURSE "${WORK_DIR}")
