@@ -71,11 +71,12 @@ signer_serial() {
 # replaces it in one rename, so that nothing ever reads a half-written program.
 sign_one() {
   local in=$1 out=$1.signing ts=$2 log
-  local args=(sign -pkcs12 "$pkcs12" -readpass - -h sha256)
+  local args=(sign -pkcs12 "$pkcs12" -readpass - -h sha256) bound=()
   [ -n "$description" ] && args+=(-n "$description")
-  [ -n "$ts" ] && args+=(-ts "$ts")
+  # A server that takes the connection and never answers is given up on like one that refuses it.
+  [ -n "$ts" ] && args+=(-ts "$ts") && bound=(timeout 30)
   rm -f "$out"
-  if log=$(printf '%s' "$MAPORA_SIGN_PASSWORD" | osslsigncode "${args[@]}" -in "$in" -out "$out" 2>&1); then
+  if log=$(printf '%s' "$MAPORA_SIGN_PASSWORD" | "${bound[@]}" osslsigncode "${args[@]}" -in "$in" -out "$out" 2>&1); then
     chmod --reference="$in" "$out" && mv -f "$out" "$in"
     return 0
   fi
