@@ -5,13 +5,17 @@
 #                                           report, the optional feature, repair, uninstall
 #   installer-test.sh upgrade BUILD_DIR     two languages chosen, major upgrade, downgrade refused
 #
-# BUILD_DIR is the x64 tree; its Xvfb display (fixture "wine") shows the console. Every failed
-# check prints what it found and what it expected; the exit code is the number of failures.
+# BUILD_DIR is the x64 tree; its Xvfb display (fixture "wine") shows the console. A third argument
+# names another x64 package to take instead of the tree's own (the signing tests' signed one), tried
+# in a folder beside it. Every failed check prints what it found and what it expected; the exit
+# code is the number of failures.
 set -uo pipefail
 scenario=$1
 build=$(cd "$2" && pwd)
+package=${3:-}
 source_dir=$(cd "$(dirname "$0")/../.." && pwd)
 work="$build/installer-tests/$scenario"
+[ -n "$package" ] && work="$(cd "$(dirname "$package")" && pwd)/installer-$scenario"
 # No menu builder: it would put the shortcut's menu entries into this machine's own desktop.
 export WINEPREFIX="$work/prefix" WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml=;winemenubuilder.exe=d"
 DISPLAY=$(cat "$build/wine-display") && export DISPLAY
@@ -52,7 +56,7 @@ reg_value() {
 property() { msiinfo export "$1" Property | tr -d '\r' | awk -F'\t' -v name="$2" '$1 == name { print $2 }'; }
 
 version=$(sed -n 's/^project(MaporaAdmin VERSION \([0-9.]*\).*/\1/p' "$source_dir/CMakeLists.txt")
-package="$build/installer/MaporaAdmin-$version-x64.msi"
+[ -n "$package" ] || package="$build/installer/MaporaAdmin-$version-x64.msi"
 [ -f "$package" ] || { echo "FAILED: $package has not been built" >&2; exit 1; }
 product_code=$(property "$package" ProductCode)
 uninstall_key="HKLM\\SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\$product_code"
