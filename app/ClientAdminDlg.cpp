@@ -3,6 +3,7 @@
 #include <htmlhelp.h>
 
 #include <iterator>
+#include <vector>
 
 #include "app/AboutDlg.h"
 #include "inventory/RunningSuiteApps.h"
@@ -30,6 +31,9 @@ constexpr DWORD kComputerNameChars = 16;
 constexpr COLORREF kPngBackground = RGB(255, 255, 255);
 constexpr COLORREF kTreeMaskColor = RGB(0, 0, 255);
 
+// The tree's images, in the order of the image list.
+std::vector<UINT> TreeImageIds() { return {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}; }
+
 CString ComputerName() {
   wchar_t name[kComputerNameChars] = L"";
   DWORD size = kComputerNameChars;
@@ -39,8 +43,8 @@ CString ComputerName() {
 
 }  // namespace
 
-// GDI+ starts with the window object (m_gdiplus), before the tree images need it.
-CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
+CClientAdminDlg::CClientAdminDlg(CWnd* parent, fw::PngPreload* treeImages)
+    : CDialog(IDD_MAPORAADMIN_DIALOG, parent), m_treeImages(treeImages) {
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
 }
 
@@ -89,12 +93,19 @@ BOOL CClientAdminDlg::OnInitDialog() {
   return TRUE;
 }
 
+std::unique_ptr<fw::PngPreload> CClientAdminDlg::PreloadTreeImages() {
+  return std::make_unique<fw::PngPreload>(fw::GetResourceHandle(), TreeImageIds(), kPngBackground);
+}
+
 void CClientAdminDlg::LoadTreeImages() {
   m_imgTree.Reset(ImageList_Create(16, 16, ILC_COLOR32 | ILC_MASK, 0, 0));
   if (!m_imgTree) return;
+  const HMODULE module = fw::GetResourceHandle();
+  std::vector<fw::ScopedBitmap> bitmaps = m_treeImages != nullptr
+                                              ? m_treeImages->Take(module)
+                                              : fw::DecodePngBitmaps(module, TreeImageIds(), kPngBackground);
   // A missing image is skipped, so the ones after it move up.
-  for (UINT id : {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}) {
-    fw::ScopedBitmap bitmap(fw::LoadPngBitmap(id, kPngBackground));
+  for (const fw::ScopedBitmap& bitmap : bitmaps) {
     if (bitmap) ImageList_AddMasked(m_imgTree.Get(), bitmap.Get(), kTreeMaskColor);
   }
   m_wndTree.SetImageList(m_imgTree.Get(), TVSIL_NORMAL);
