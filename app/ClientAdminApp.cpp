@@ -28,9 +28,6 @@ BOOL CClientAdminApp::InitInstance() {
   fw::TraceStartup("resource library");
   HINSTANCE localized = KVELLocale::LoadLocalizedRes(m_hInstance);
   if (localized != nullptr) fw::SetResourceHandle(localized);
-  fw::TraceStartup("tree images preload started");
-  // Decoded while the libraries load and the window is built; kept until the window is gone.
-  const std::unique_ptr<fw::PngPreload> treeImages = CClientAdminDlg::PreloadTreeImages();
 
   // No template hosts an ActiveX control, so dialogs need no control container.
   fw::TraceStartup("OLE");
@@ -46,8 +43,8 @@ BOOL CClientAdminApp::InitInstance() {
   InitCommonControls(ICC_TREEVIEW_CLASSES | ICC_STANDARD_CLASSES | ICC_LINK_CLASS);
 
   {
-    fw::TraceStartup("main window constructor (icon)");
-    CClientAdminDlg mainDlg(nullptr, treeImages.get());
+    fw::TraceStartup("main window constructor (icon, GDI+)");
+    CClientAdminDlg mainDlg;
     fw::TraceStartup("main window created from its template");
     m_pMainWnd = &mainDlg;
     mainDlg.DoModal();

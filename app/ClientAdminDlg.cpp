@@ -3,7 +3,6 @@
 #include <htmlhelp.h>
 
 #include <iterator>
-#include <vector>
 
 #include "app/AboutDlg.h"
 #include "inventory/RunningSuiteApps.h"
@@ -31,9 +30,6 @@ constexpr DWORD kComputerNameChars = 16;
 constexpr COLORREF kPngBackground = RGB(255, 255, 255);
 constexpr COLORREF kTreeMaskColor = RGB(0, 0, 255);
 
-// The tree's images, in the order of the image list.
-std::vector<UINT> TreeImageIds() { return {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}; }
-
 CString ComputerName() {
   wchar_t name[kComputerNameChars] = L"";
   DWORD size = kComputerNameChars;
@@ -43,8 +39,8 @@ CString ComputerName() {
 
 }  // namespace
 
-CClientAdminDlg::CClientAdminDlg(CWnd* parent, fw::PngPreload* treeImages)
-    : CDialog(IDD_MAPORAADMIN_DIALOG, parent), m_treeImages(treeImages) {
+// GDI+ starts with the window object (m_gdiplus), before the tree images need it.
+CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
 }
 
@@ -93,19 +89,12 @@ BOOL CClientAdminDlg::OnInitDialog() {
   return TRUE;
 }
 
-std::unique_ptr<fw::PngPreload> CClientAdminDlg::PreloadTreeImages() {
-  return std::make_unique<fw::PngPreload>(fw::GetResourceHandle(), TreeImageIds(), kPngBackground);
-}
-
 void CClientAdminDlg::LoadTreeImages() {
   m_imgTree.Reset(ImageList_Create(16, 16, ILC_COLOR32 | ILC_MASK, 0, 0));
   if (!m_imgTree) return;
-  const HMODULE module = fw::GetResourceHandle();
-  std::vector<fw::ScopedBitmap> bitmaps = m_treeImages != nullptr
-                                              ? m_treeImages->Take(module)
-                                              : fw::DecodePngBitmaps(module, TreeImageIds(), kPngBackground);
   // A missing image is skipped, so the ones after it move up.
-  for (const fw::ScopedBitmap& bitmap : bitmaps) {
+  for (UINT id : {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}) {
+    fw::ScopedBitmap bitmap(fw::LoadPngBitmap(id, kPngBackground));
     if (bitmap) ImageList_AddMasked(m_imgTree.Get(), bitmap.Get(), kTreeMaskColor);
   }
   m_wndTree.SetImageList(m_imgTree.Get(), TVSIL_NORMAL);

@@ -6,23 +6,17 @@
 #include <commctrl.h>
 
 #include <cstdint>
-#include <memory>
 
 #include "framework/Controls.h"
 #include "framework/Dialog.h"
-#include "framework/PngResource.h"
+#include "framework/GdiPlus.h"
 #include "inventory/AdminSession.h"
 
 // The shared state of the run (installed products, display language, whether machine settings
 // may be written) is the AdminSession part, which the pages reach through their back-pointer.
 class CClientAdminDlg : public CDialog, public AdminSession {
  public:
-  // With treeImages, the tree takes its images from there instead of decoding them itself.
-  explicit CClientAdminDlg(CWnd* parent = nullptr, fw::PngPreload* treeImages = nullptr);
-
-  // The tree's images from the resource module in use, decoding from now on; for a window built
-  // later with them.
-  static std::unique_ptr<fw::PngPreload> PreloadTreeImages();
+  explicit CClientAdminDlg(CWnd* parent = nullptr);
 
   // Enables the Apply button; offered to the pages.
   void EnableApply() override;
@@ -55,7 +49,7 @@ class CClientAdminDlg : public CDialog, public AdminSession {
   CTreeCtrl m_wndTree;
   fw::ScopedImageList m_imgTree;
   HICON m_hIcon = nullptr;  // a shared icon: the system frees it with the module
-  fw::PngPreload* m_treeImages = nullptr;
+  fw::GdiplusSession m_gdiplus;
   HTREEITEM m_hRootItem = nullptr;
   bool m_bPagesCreated = false;
 };
