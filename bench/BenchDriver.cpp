@@ -546,15 +546,15 @@ int wmain(int argc, wchar_t** argv) {
     subject.closeSteps.Print((name + ": shutdown steps").c_str(), "Cancel", "the process ended");
   }
 
-  std::printf("\nBENCH startup_min_ratio=%.2f startup_ratio=%.2f console_min_ms=%.1f floor_min_ms=%.1f "
-              "console_ms=%.1f floor_ms=%.1f advanced_ms=%.1f advanced_min_ms=%.1f ws_ratio=%.2f "
-              "console_ws_mb=%.1f floor_ws_mb=%.1f",
-              Ratio(Minimum(console.startupMs), Minimum(floor.startupMs)),
-              Ratio(Median(console.startupMs), Median(floor.startupMs)), Minimum(console.startupMs),
-              Minimum(floor.startupMs), Median(console.startupMs), Median(floor.startupMs),
-              Median(console.advancedMs), Minimum(console.advancedMs),
-              Ratio(Median(console.peakWorkingSetMb), Median(floor.peakWorkingSetMb)),
-              Median(console.peakWorkingSetMb), Median(floor.peakWorkingSetMb));
+  std::printf(
+      "\nBENCH startup_min_ratio=%.2f startup_ratio=%.2f console_min_ms=%.1f floor_min_ms=%.1f "
+      "console_ms=%.1f floor_ms=%.1f advanced_ms=%.1f advanced_min_ms=%.1f ws_ratio=%.2f "
+      "console_ws_mb=%.1f floor_ws_mb=%.1f",
+      Ratio(Minimum(console.startupMs), Minimum(floor.startupMs)),
+      Ratio(Median(console.startupMs), Median(floor.startupMs)), Minimum(console.startupMs), Minimum(floor.startupMs),
+      Median(console.startupMs), Median(floor.startupMs), Median(console.advancedMs), Minimum(console.advancedMs),
+      Ratio(Median(console.peakWorkingSetMb), Median(floor.peakWorkingSetMb)), Median(console.peakWorkingSetMb),
+      Median(floor.peakWorkingSetMb));
   if (options.close)
     std::printf(" console_close_ms=%.1f floor_close_ms=%.1f", Median(console.closeMs), Median(floor.closeMs));
   if (baseline != nullptr)
