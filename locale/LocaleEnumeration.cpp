@@ -55,10 +55,10 @@ void Enumerate(unsigned short langId, unsigned short countryId, const wchar_t* n
 }
 
 // For a name of ASCII letters, digits and hyphens only (as every ISO name is): its letters in
-// upper case and its digits, hyphens left out; false for any other name. lstrcmpiW finds two such
-// names equal only when their keys are: no locale's letter case folds one ASCII letter into another,
-// and whatever a hyphen weighs, the key has none. So the key picks the only locales such a name can
-// match, and lstrcmpiW still decides whether it does.
+// upper case and its digits, hyphens left out; false for any other name. lstrcmpiW finds such a
+// name equal to an ISO name only when their keys are equal: no locale's letter case folds one ASCII
+// letter into another, and whatever a hyphen weighs, the key has none. So the key picks the only
+// locales such a name can match, and lstrcmpiW still decides whether it does.
 bool PlainNameKey(const wchar_t* name, std::wstring& key) {
   key.clear();
   if (name == nullptr || *name == L'\0') return false;
