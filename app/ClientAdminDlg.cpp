@@ -1,6 +1,7 @@
 #include "app/ClientAdminDlg.h"
 
 #include <htmlhelp.h>
+#include <shlwapi.h>
 
 #include <iterator>
 #include <vector>
@@ -142,10 +143,15 @@ void CClientAdminDlg::SetHelpFilePath() {
   if (app == nullptr) return;
   const std::wstring release = GetProductVersion();
   std::wstring installDir;
-  CString helpPath;
+  // The product's help folder first, as the suite installs its help there; otherwise the bare name,
+  // which the locale library looks for in the suite's own help folder (<Common Files>\Mapora\help),
+  // where the console's package puts its copy.
+  CString helpPath = kHelpFileName;
   if (GetInstallDir(static_cast<int>(ProductKind::Desktop), release, installDir) ||
-      GetInstallDir(static_cast<int>(ProductKind::Engine), release, installDir))
-    helpPath = installDir + L"\\help\\" + kHelpFileName;
+      GetInstallDir(static_cast<int>(ProductKind::Engine), release, installDir)) {
+    const std::wstring productHelp = installDir + L"\\help\\" + kHelpFileName;
+    if (PathFileExistsW(productHelp.c_str())) helpPath = productHelp;
+  }
   app->SetHelpFilePath(helpPath);
 }
 

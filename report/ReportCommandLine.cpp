@@ -20,6 +20,8 @@ ParsedCommandLine ParseReportCommandLine(int argc, const wchar_t* const* argv) {
       parsed.options.json = true;
     } else if (std::wcscmp(argument, kHelp) == 0 || std::wcscmp(argument, L"/?") == 0) {
       parsed.options.help = true;
+    } else if (std::wcscmp(argument, L"--version") == 0) {
+      parsed.options.version = true;
     } else if (std::wcscmp(argument, kOut) == 0) {
       if (i + 1 >= argc || argv[i + 1] == nullptr || argv[i + 1][0] == L'\0' || IsOption(argv[i + 1])) {
         parsed.error = CommandLineError::MissingFileName;

@@ -6,6 +6,7 @@
 struct ReportOptions {
   bool json = false;
   bool help = false;
+  bool version = false;
   // Empty: standard output.
   std::wstring outFile;
 };
@@ -19,7 +20,7 @@ struct ParsedCommandLine {
   std::wstring argument;
 };
 
-// Arguments 1..argc-1: "--json", "--help", "--out FILE". The first wrong argument ends the walk.
+// Arguments 1..argc-1: "--json", "--help", "--version", "--out FILE". The first wrong argument ends the walk.
 // A file name that looks like an option ("--out --json") counts as missing: such a name is far
 // more likely a forgotten one than a file meant to be called that.
 ParsedCommandLine ParseReportCommandLine(int argc, const wchar_t* const* argv);

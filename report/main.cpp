@@ -6,6 +6,7 @@
 #include <exception>
 #include <string>
 
+#include "MaporaVersion.h"
 #include "framework/App.h"
 #include "framework/Strings.h"
 #include "inventory/InstallationReport.h"
@@ -79,6 +80,8 @@ int Run(int argc, const wchar_t* const* argv) {
   if (parsed.error != CommandLineError::None) return UsageError(parsed);
   const ReportOptions& options = parsed.options;
   if (options.help) return Emit(L"", ToUtf8(ToolString(IDS_REPORT_USAGE)));
+  if (options.version)
+    return Emit(L"", ToUtf8(fw::Format(ToolString(IDS_REPORT_VERSION).c_str(), MAPORA_FILE_VERSION_WTEXT)));
 
   // COM as the console has it: the runtime-information component answers only there.
   CWinApp app;

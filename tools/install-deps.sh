@@ -13,6 +13,8 @@ packages=(
   wine wine64 fonts-wine
   xvfb xauth x11-utils imagemagick
   fp-utils
+  # The Windows Installer packages (wixl) and reading them back (msiinfo, msiextract)
+  wixl msitools
   # Japanese and Chinese glyphs for the language packs under Wine (its own Tahoma has Arabic)
   fonts-vlgothic fonts-wqy-microhei
 )

@@ -23,7 +23,9 @@ here=$(cd "$(dirname "$0")" && pwd)
 root=$(dirname "$here")
 
 export WINEPREFIX="${MAPORA_WORKSTATION_PREFIX:-$root/build/workstation/prefix}"
-export WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml="
+# No menu builder: the package's Start-menu shortcut would otherwise land in this machine's own
+# desktop menus.
+export WINEARCH=win64 WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml=;winemenubuilder.exe=d"
 
 # --- Workstation layout (Windows paths) -----------------------------------------------------
 PROGRAM_FILES_X86='C:\Program Files (x86)'
@@ -39,7 +41,7 @@ CONSOLE_EXE="$CONSOLE_DIR\\MaporaAdmin.exe"
 # Where the stand-ins of suite components that the console talks to are installed.
 STANDINS_DIR="$COMMON_FILES\\Kvel\\bin"
 
-STEPS=(prefix virtual_desktop fonts products runtime_info portal_manager console language_packs)
+STEPS=(prefix virtual_desktop fonts products runtime_info portal_manager console product_language_packs)
 
 # --- Helpers ----------------------------------------------------------------------------------
 die() { echo "workstation: $*" >&2; exit 1; }
@@ -66,6 +68,14 @@ install_file() {
 
 wine_quiet() { wine "$@" </dev/null >/dev/null 2>&1; }
 
+# The Windows path of a Unix path (Wine's Z: drive).
+windows_path() { echo "Z:$(realpath -m "$1" | tr / '\\')"; }
+
+# The ProductCode of a package, read back from its Property table.
+package_product_code() {
+  msiinfo export "$1" Property | awk -F'\t' '$1 == "ProductCode" { print $2 }' | tr -d '\r'
+}
+
 # Imports .reg text (REGEDIT4, from a file or stdin) into the prefix's registry. With --both-views
 # the keys under HKEY_LOCAL_MACHINE\SOFTWARE go into the 32-bit view (Wow6432Node) as well.
 import_registry() {
@@ -79,7 +89,7 @@ import_registry() {
       echo "$text" | sed -e 1d -e 's/^\[HKEY_LOCAL_MACHINE\\SOFTWARE\\/[HKEY_LOCAL_MACHINE\\SOFTWARE\\Wow6432Node\\/'
     fi
   } > "$file"
-  wine_quiet regedit /S "Z:$(realpath "$file" | tr / '\\')" || die "registry import failed"
+  wine_quiet regedit /S "$(windows_path "$file")" || die "registry import failed"
   rm -f "$file"
 }
 
@@ -132,21 +142,33 @@ step_portal_manager() {
   wine_quiet regsvr32 /s "$STANDINS_DIR\\PortalManager.dll" || die "regsvr32 PortalManager.dll failed"
 }
 
-# The console, and beside it the headless report that inventory jobs run.
+# The console, the headless report, the language packs and the help, from the x64 package, as
+# administrators install them. The same version already installed is reinstalled from the new
+# package, every file overwritten, so that a rebuilt console replaces the one in the prefix.
 step_console() {
-  install_file "$(built app/MaporaAdmin.exe)" "$CONSOLE_EXE"
-  install_file "$(built report/MaporaReport.exe)" "$CONSOLE_DIR\\MaporaReport.exe"
+  local package log code mode=() doing=Installing
+  package="$BUILD/installer/$(cat "$(built installer/package-name.txt)")"
+  [ -f "$package" ] || die "$package is missing; build the x64 tree first (cmake --build --preset x64)"
+  log="$WINEPREFIX/../msiexec.log"
+  code=$(package_product_code "$package")
+  if wine_quiet reg query "HKLM\\SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Uninstall\\$code"; then
+    mode=(REINSTALL=ALL REINSTALLMODE=vamus)
+    doing=Reinstalling
+  fi
+  echo "$doing $(basename "$package")"
+  wine_quiet msiexec /i "$(windows_path "$package")" "${mode[@]}" /qn /l*v "$(windows_path "$log")" ||
+    die "$doing $package failed; see $log"
 }
 
-# The console's language packs where it loads them, <Common Files>\Mapora\bin\<tag> as the 64-bit
-# and the 32-bit console see it, and in the products' bin folders, which Advanced Configuration
-# lists; the help file in the Desktop product's help folder with its French translation.
-step_language_packs() {
+# The products' own copies of the language packs in their bin folders, which Advanced Configuration
+# lists, and the Desktop product's help file with its French translation (the package puts the
+# console's packs and help under <Common Files>\Mapora).
+step_product_language_packs() {
   local pack tag dir help=administering_mapora_desktop.chm
   for pack in "$BUILD"/packs/*/ResMaporaAdmin.dll; do
     [ -f "$pack" ] || die "$BUILD/packs holds no language pack; build the x64 tree first"
     tag=$(basename "$(dirname "$pack")")
-    for dir in "$COMMON_FILES\\Mapora" "$COMMON_FILES_X86\\Mapora" "$DESKTOP_DIR" "$ENGINE_DIR"; do
+    for dir in "$DESKTOP_DIR" "$ENGINE_DIR"; do
       install_file "$pack" "$dir\\bin\\$tag\\ResMaporaAdmin.dll"
     done
   done

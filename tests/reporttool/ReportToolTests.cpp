@@ -6,6 +6,7 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
+#include "MaporaVersion.h"
 #include "tests/e2e/ConsoleDriver.h"
 #include "tests/support/TestSupport.h"
 
@@ -124,6 +125,7 @@ TEST_F(Workstation, ExitCodesAndMessages) {
   const std::tuple<const wchar_t*, DWORD, std::array<const char*, 3>> kRows[] = {
       {L"--json", 0, {"{\n  \"release\": \"10.5\",", "", ""}},
       {L"--help", 0, {"Usage: MaporaReport [--json] [--out FILE]\r\n", "", ""}},
+      {L"--version", 0, {"MaporaReport " MAPORA_FILE_VERSION_TEXT "\r\n", "", ""}},
       {L"--bogus", 2, {"", "MaporaReport: unknown option --bogus\r\nUsage: ", ""}},
       {L"--out", 2, {"", "MaporaReport: --out needs a file name\r\nUsage: ", ""}},
       {L"--out no\\r.txt", 1, {"", "MaporaReport: cannot write no\\r.txt: ", ""}},
