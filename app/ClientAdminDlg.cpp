@@ -1,7 +1,6 @@
 #include "app/ClientAdminDlg.h"
 
 #include <htmlhelp.h>
-#include <shlwapi.h>
 
 #include <iterator>
 #include <vector>
@@ -143,15 +142,10 @@ void CClientAdminDlg::SetHelpFilePath() {
   if (app == nullptr) return;
   const std::wstring release = GetProductVersion();
   std::wstring installDir;
-  // The product's help folder first, as the suite installs its help there; otherwise the bare name,
-  // which the locale library looks for in the suite's own help folder (<Common Files>\Mapora\help),
-  // where the console's package puts its copy.
-  CString helpPath = kHelpFileName;
+  CString helpPath;
   if (GetInstallDir(static_cast<int>(ProductKind::Desktop), release, installDir) ||
-      GetInstallDir(static_cast<int>(ProductKind::Engine), release, installDir)) {
-    const std::wstring productHelp = installDir + L"\\help\\" + kHelpFileName;
-    if (PathFileExistsW(productHelp.c_str())) helpPath = productHelp;
-  }
+      GetInstallDir(static_cast<int>(ProductKind::Engine), release, installDir))
+    helpPath = installDir + L"\\help\\" + kHelpFileName;
   app->SetHelpFilePath(helpPath);
 }
 

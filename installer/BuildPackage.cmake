@@ -5,7 +5,6 @@
 #
 # The staging folder holds exactly what goes into the package (installer/CMakeLists.txt fills it):
 #   bin/MaporaAdmin.exe  bin/MaporaReport.exe  packs/<tag>/ResMaporaAdmin.dll
-#   help/administering_mapora_desktop.chm  help/fr/administering_mapora_desktop.chm
 #   policy/Mapora.admx  policy/<locale>/Mapora.adml  MaporaAdmin.ico
 # This step only reads it, so anything that has to change the files before they are packaged
 # (signing the programs and packs) rewrites them there first; anything that has to change the

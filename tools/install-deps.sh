@@ -15,6 +15,8 @@ packages=(
   fp-utils
   # The Windows Installer packages (wixl) and reading them back (msiinfo, msiextract)
   wixl msitools
+  # Authenticode signing of what ships, and the signing tests' throwaway certificates
+  osslsigncode openssl
   # Japanese and Chinese glyphs for the language packs under Wine (its own Tahoma has Arabic)
   fonts-vlgothic fonts-wqy-microhei
 )

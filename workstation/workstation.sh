@@ -142,7 +142,7 @@ step_portal_manager() {
   wine_quiet regsvr32 /s "$STANDINS_DIR\\PortalManager.dll" || die "regsvr32 PortalManager.dll failed"
 }
 
-# The console, the headless report, the language packs and the help, from the x64 package, as
+# The console, the headless report and the language packs, from the x64 package, as
 # administrators install them. The same version already installed is reinstalled from the new
 # package, every file overwritten, so that a rebuilt console replaces the one in the prefix.
 step_console() {
@@ -161,8 +161,8 @@ step_console() {
 }
 
 # The products' own copies of the language packs in their bin folders, which Advanced Configuration
-# lists, and the Desktop product's help file with its French translation (the package puts the
-# console's packs and help under <Common Files>\Mapora).
+# lists, and the Desktop product's help file with its French translation, which the console opens
+# from there (the package puts only the console's own packs, under <Common Files>\Mapora).
 step_product_language_packs() {
   local pack tag dir help=administering_mapora_desktop.chm
   for pack in "$BUILD"/packs/*/ResMaporaAdmin.dll; do

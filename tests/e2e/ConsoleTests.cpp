@@ -103,18 +103,6 @@ TEST_F(Console, MainWindowInTheLanguageOfThePackWithItsHelp) {
   }
 }
 
-// Without the product's own help file, help opens the console's copy in <Common Files>\Mapora\help,
-// where its package puts it.
-TEST_F(Console, HelpFromTheSuiteFolderWhenTheProductHasNone) {
-  ScopedDirectory suiteHelp{MaporaCommonFolder() + L"\\help"};
-  ASSERT_TRUE(DeleteFileW((m_desktopFolder.Path() + L"\\help" + kHelpFile).c_str()));
-  ASSERT_TRUE(CopyFileTo(WindowsPath(MAPORA_HELP_DIR) + kHelpFile, suiteHelp.Path() + kHelpFile));
-  HWND main = Launch();
-  ASSERT_NE(main, nullptr);
-  Click(main, IDC_HELP_BUTTON);
-  EXPECT_NE(m_console->WaitForWindow(L"Administering Mapora Desktop"), nullptr);
-}
-
 TEST_F(Console, AboutBoxShowsTheDesktopServicePack) {
   HWND main = Launch();
   ASSERT_NE(main, nullptr);

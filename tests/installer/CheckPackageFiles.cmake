@@ -3,8 +3,8 @@
 # Fails unless every program and library in the package is of the expected kind and carries the
 # project's file version, and all of them are there (two programs, one pack per language): a
 # package built from the other tree's files, or with one file taken from there, would install and
-# then not load; a file left at another version would not be replaced by an upgrade. The packs and
-# the help must sit under SUITE_ROOT, the common files folder of the package's console.
+# then not load; a file left at another version would not be replaced by an upgrade. The packs
+# must sit under SUITE_ROOT, the common files folder of the package's console.
 foreach(var PACKAGE EXPECTED FILE_VERSION SUITE_ROOT WORK_DIR)
   if(NOT ${var})
     message(FATAL_ERROR "-D${var}=... is required")
@@ -17,7 +17,7 @@ execute_process(COMMAND msiinfo export "${PACKAGE}" Directory OUTPUT_VARIABLE di
 string(REGEX MATCH "\nSuiteDir\t[^\t]*" suite_dir "${directories}")
 string(REPLACE "\nSuiteDir\t" "" suite_dir "${suite_dir}")
 if(NOT suite_dir STREQUAL SUITE_ROOT)
-  message(SEND_ERROR "${PACKAGE}: packs and help under ${suite_dir}, expected ${SUITE_ROOT}")
+  message(SEND_ERROR "${PACKAGE}: packs under ${suite_dir}, expected ${SUITE_ROOT}")
 endif()
 file(REMOVE_RECURSE "${WORK_DIR}")
 file(MAKE_DIRECTORY "${WORK_DIR}")
