@@ -3,6 +3,7 @@
 #include <htmlhelp.h>
 
 #include <iterator>
+#include <vector>
 
 #include "app/AboutDlg.h"
 #include "framework/App.h"
@@ -26,7 +27,6 @@ constexpr COLORREF kTreeMaskColor = RGB(0, 0, 255);
 
 }  // namespace
 
-// GDI+ starts with the window object (m_gdiplus), before the tree images need it.
 CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
 }
@@ -52,6 +52,12 @@ const MessageMap* CClientAdminDlg::GetMessageMap() const {
 }
 
 BOOL CClientAdminDlg::OnInitDialog() {
+  fw::TraceStartup("OnInitDialog: tree images decoding started");
+  // The tree's images decode on a worker while the rest of the window is built: the first one
+  // loads GDI+'s codecs, which takes about as long as the settings and the report together. The
+  // tree gets them before the window is shown.
+  fw::PngPreload treeImages(fw::GetResourceHandle(), {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE},
+                            kPngBackground);
   fw::TraceStartup("OnInitDialog: system menu, icon");
   CDialog::OnInitDialog();
 
@@ -65,24 +71,23 @@ BOOL CClientAdminDlg::OnInitDialog() {
   SetIcon(m_hIcon, true);
   SetIcon(m_hIcon, false);
 
-  fw::TraceStartup("OnInitDialog: tree images");
-  LoadTreeImages();
   // Only the enumerator it keeps matters here: detection asks it which runtimes are present.
   fw::TraceStartup("OnInitDialog: runtime list");
   ListInstalledRuntimeVersions(m_installedProducts);
   LoadSettings();
   fw::TraceStartup("OnInitDialog: page tree");
   BuildPageTree();
+  fw::TraceStartup("OnInitDialog: tree images");
+  SetTreeImages(treeImages.Take());
   fw::TraceStartup("OnInitDialog done: window shown");
   return TRUE;
 }
 
-void CClientAdminDlg::LoadTreeImages() {
+void CClientAdminDlg::SetTreeImages(const std::vector<fw::ScopedBitmap>& bitmaps) {
   m_imgTree.Reset(ImageList_Create(16, 16, ILC_COLOR32 | ILC_MASK, 0, 0));
   if (!m_imgTree) return;
   // A missing image is skipped, so the ones after it move up.
-  for (UINT id : {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}) {
-    fw::ScopedBitmap bitmap(fw::LoadPngBitmap(id, kPngBackground));
+  for (const fw::ScopedBitmap& bitmap : bitmaps) {
     if (bitmap) ImageList_AddMasked(m_imgTree.Get(), bitmap.Get(), kTreeMaskColor);
   }
   m_wndTree.SetImageList(m_imgTree.Get(), TVSIL_NORMAL);

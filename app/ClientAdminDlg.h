@@ -6,10 +6,11 @@
 #include <commctrl.h>
 
 #include <cstdint>
+#include <vector>
 
 #include "framework/Controls.h"
 #include "framework/Dialog.h"
-#include "framework/GdiPlus.h"
+#include "framework/PngResource.h"
 #include "inventory/AdminSession.h"
 
 // The shared state of the run (installed products, display language, whether machine settings
@@ -39,7 +40,7 @@ class CClientAdminDlg : public CDialog, public AdminSession {
 
   void LoadSettings();
   void BuildPageTree();
-  void LoadTreeImages();
+  void SetTreeImages(const std::vector<fw::ScopedBitmap>& bitmaps);
   void ShowSelectedPage();
   void SetHelpFilePath();
   void ShowAboutBox();
@@ -47,7 +48,6 @@ class CClientAdminDlg : public CDialog, public AdminSession {
   CTreeCtrl m_wndTree;
   fw::ScopedImageList m_imgTree;
   HICON m_hIcon = nullptr;  // a shared icon: the system frees it with the module
-  fw::GdiplusSession m_gdiplus;
   HTREEITEM m_hRootItem = nullptr;
   bool m_bPagesCreated = false;
 };

@@ -2,6 +2,7 @@
 #include "locale/LocaleInternals.h"
 #include "locale/LocaleNameCatalog.h"
 
+#include <algorithm>
 #include <utility>
 #include <vector>
 
@@ -33,6 +34,26 @@ struct NameSearch {
   bool found = false;
   LANGID langId = 0;
 };
+
+// For a name of ASCII letters, digits and hyphens only (as every ISO name is): its letters in
+// upper case and its digits, hyphens left out; false for any other name. lstrcmpiW finds such a
+// name equal to an ISO name only when their keys are equal: no locale's letter case folds one ASCII
+// letter into another, and whatever a hyphen weighs, the key has none. So the key picks the only
+// locales such a name can match, and lstrcmpiW still decides whether it does.
+bool PlainNameKey(const wchar_t* name, std::wstring& key) {
+  key.clear();
+  if (name == nullptr || *name == L'\0') return false;
+  for (const wchar_t* c = name; *c != L'\0'; ++c) {
+    if (*c >= L'a' && *c <= L'z') {
+      key += static_cast<wchar_t>(*c - L'a' + L'A');
+    } else if ((*c >= L'A' && *c <= L'Z') || (*c >= L'0' && *c <= L'9')) {
+      key += *c;
+    } else if (*c != L'-') {
+      return false;
+    }
+  }
+  return true;
+}
 
 }  // namespace
 
@@ -126,12 +147,43 @@ LocaleNameCatalog LocaleNameCatalog::FromSystem() {
   return LocaleNameCatalog(std::move(locales));
 }
 
+LocaleNameCatalog::LocaleNameCatalog(std::vector<LocaleIsoNames> locales) : m_locales(std::move(locales)) {
+  std::wstring languageKey;
+  std::wstring localeKey;
+  for (size_t i = 0; i < m_locales.size(); ++i) {
+    const LocaleIsoNames& locale = m_locales[i];
+    const bool plainLanguage = PlainNameKey(locale.language.c_str(), languageKey);
+    const bool plainLocale =
+        locale.languageAndCountry.empty() || PlainNameKey(locale.languageAndCountry.c_str(), localeKey);
+    if (!plainLanguage || !plainLocale) {
+      m_withoutPlainKey.push_back(i);
+      continue;
+    }
+    m_byPlainKey[languageKey].push_back(i);
+    if (!locale.languageAndCountry.empty() && localeKey != languageKey) m_byPlainKey[localeKey].push_back(i);
+  }
+}
+
+std::vector<size_t> LocaleNameCatalog::Candidates(const wchar_t* name) const {
+  std::wstring key;
+  if (!PlainNameKey(name, key)) {
+    std::vector<size_t> all(m_locales.size());
+    for (size_t i = 0; i < all.size(); ++i) all[i] = i;
+    return all;
+  }
+  std::vector<size_t> candidates = m_withoutPlainKey;
+  const auto keyed = m_byPlainKey.find(key);
+  if (keyed != m_byPlainKey.end()) candidates.insert(candidates.end(), keyed->second.begin(), keyed->second.end());
+  std::sort(candidates.begin(), candidates.end());
+  return candidates;
+}
+
 bool LocaleNameCatalog::LangIdFromName(const wchar_t* name, unsigned short& langId) const {
   langId = 0;
   if (!name) return false;
-  for (const LocaleIsoNames& locale : m_locales) {
+  for (size_t i : Candidates(name)) {
     LANGID named = 0;
-    if (MatchFolderName(name, locale, named)) {
+    if (MatchFolderName(name, m_locales[i], named)) {
       langId = named;
       return true;
     }

@@ -7,6 +7,7 @@
 #include <windows.h>
 
 #include <string>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
@@ -43,7 +44,7 @@ bool MatchFolderName(const wchar_t* folderName, const LocaleIsoNames& locale, LA
 
 class LocaleNameCatalog {
  public:
-  explicit LocaleNameCatalog(std::vector<LocaleIsoNames> locales) : m_locales(std::move(locales)) {}
+  explicit LocaleNameCatalog(std::vector<LocaleIsoNames> locales);
 
   // The supported locales in the system's order, as GetLangIDFromName walks them.
   static LocaleNameCatalog FromSystem();
@@ -55,7 +56,15 @@ class LocaleNameCatalog {
   const std::vector<LocaleIsoNames>& Locales() const { return m_locales; }
 
  private:
+  // The locales a name can match at all, in catalog order, so that a name is compared with a few
+  // locales instead of all of them.
+  std::vector<size_t> Candidates(const wchar_t* name) const;
+
   std::vector<LocaleIsoNames> m_locales;
+  // Positions in m_locales by the plain key (PlainNameKey) of either of the locale's names.
+  std::unordered_map<std::wstring, std::vector<size_t>> m_byPlainKey;
+  // Locales with a name that has no plain key: every name is compared with them.
+  std::vector<size_t> m_withoutPlainKey;
 };
 
 }  // namespace KVELLocale

@@ -1,10 +1,13 @@
-// The console's command line, walked as start-up walks it, and the About box's service-pack texts.
+// The console's command line, walked as start-up walks it, the About box's service-pack texts and
+// the tree images decoded on a worker.
 #include <gtest/gtest.h>
 
 #include <vector>
 
 #include "app/AboutDlg.h"
 #include "app/CommandLine.h"
+#include "framework/PngResource.h"
+#include "res/resource.h"
 
 namespace {
 
@@ -42,6 +45,49 @@ TEST(ServicePackFields, ShowTheNameAndTheBuildAfterItsFirstDot) {
     EXPECT_EQ(texts.servicePack, row.pack);
     EXPECT_EQ(texts.build, row.shown);
   }
+}
+
+// The bitmap's pixels as 32-bit rows, top first; empty for no bitmap.
+std::vector<unsigned char> Pixels(const fw::ScopedBitmap& bitmap) {
+  BITMAP info = {};
+  if (!bitmap || GetObjectW(bitmap.Get(), sizeof info, &info) == 0) return {};
+  BITMAPINFO header = {};
+  header.bmiHeader = {sizeof header.bmiHeader, info.bmWidth, -info.bmHeight, 1, 32, BI_RGB, 0, 0, 0, 0, 0};
+  std::vector<unsigned char> pixels(static_cast<size_t>(info.bmWidth) * info.bmHeight * 4);
+  HDC screen = GetDC(nullptr);
+  GetDIBits(screen, bitmap.Get(), 0, info.bmHeight, pixels.data(), &header, DIB_RGB_COLORS);
+  ReleaseDC(nullptr, screen);
+  return pixels;
+}
+
+TEST(PngPreload, GivesWhatDecodingHereGivesInTheOrderAsked) {
+  const HMODULE console = GetModuleHandleW(nullptr);
+  const UINT missing = 1;
+  const struct { const char* name; HMODULE module; std::vector<UINT> ids; std::vector<bool> present; } rows[] = {
+      {"TreeImages", console, {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}, {true, true, true}},
+      {"OtherOrder", console, {IDB_TREE_PAGE, IDB_TREE_WORKSTATION}, {true, true}},
+      {"MissingKeepsItsPlace", console, {IDB_TREE_FOLDER, missing, IDB_TREE_PAGE}, {true, false, true}},
+      {"ModuleWithoutImages", GetModuleHandleW(L"kernel32.dll"), {IDB_TREE_WORKSTATION}, {false}},
+      {"NoImages", console, {}, {}},
+  };
+  for (const auto& row : rows) {
+    SCOPED_TRACE(row.name);
+    fw::PngPreload preload(row.module, row.ids, RGB(255, 255, 255));
+    const std::vector<fw::ScopedBitmap> here = fw::DecodePngBitmaps(row.module, row.ids, RGB(255, 255, 255));
+    // The second Take decodes on this thread: both must give the same.
+    for (const std::vector<fw::ScopedBitmap>& got : {preload.Take(), preload.Take()}) {
+      ASSERT_EQ(got.size(), row.present.size());
+      for (size_t i = 0; i < got.size(); ++i) {
+        EXPECT_EQ(got[i].IsValid(), row.present[i]) << "image " << i;
+        EXPECT_EQ(Pixels(got[i]), Pixels(here[i])) << "image " << i;
+      }
+    }
+  }
+  // The order is only seen if the images differ.
+  const std::vector<fw::ScopedBitmap> tree =
+      fw::DecodePngBitmaps(console, {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}, RGB(255, 255, 255));
+  EXPECT_NE(Pixels(tree[0]), Pixels(tree[1]));
+  EXPECT_NE(Pixels(tree[1]), Pixels(tree[2]));
 }
 
 }  // namespace

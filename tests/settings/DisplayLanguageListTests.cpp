@@ -2,6 +2,7 @@
 // entries, selection and warning out), and how pack folders are recognised by name.
 #include <gtest/gtest.h>
 
+#include "locale/LocaleInternals.h"
 #include "locale/LocaleNameCatalog.h"
 #include "settings/LanguagePackFolders.h"
 
@@ -79,6 +80,24 @@ TEST(LocaleNameCatalog, NamesALanguageOrAWholeLocaleFirstInItsOrder) {
     EXPECT_EQ(langId, row.langId);
   }
   EXPECT_EQ(UILocaleName(0x0C0C), L"fr-CA");
+}
+
+TEST(LocaleNameCatalog, SystemCatalogFindsWhatTheEnumerationFinds) {
+  // Names the catalog narrows down by their letters, and names it must compare with every locale.
+  const wchar_t* const folders[] = {
+      L"fr",      L"FR-ca",       L"de-AT",      L"deAT",         L"de-",        L"-de",   L"zh-CN",
+      L"es-419",  L"id-ID",       L"ID-id",      L"xx",           L"",           L"de_AT", L"fr-CA ",
+      L"d\u00e9", L"de\u00ad-AT", L"fr-\u0421A", L"\uff46\uff52", L"sr-Latn-RS",
+  };
+  const KVELLocale::LocaleNameCatalog catalog = KVELLocale::LocaleNameCatalog::FromSystem();
+  ASSERT_GT(catalog.Locales().size(), 100u);
+  for (const wchar_t* folder : folders) {
+    unsigned short expected = 0xFFFF;
+    unsigned short got = 0xFFFF;
+    const bool expectedFound = KVELLocale::GetLangIDFromName(folder, expected);
+    EXPECT_EQ(catalog.LangIdFromName(folder, got), expectedFound) << "folder \"" << folder << "\"";
+    EXPECT_EQ(got, expected) << "folder \"" << folder << "\"";
+  }
 }
 
 }  // namespace
