@@ -103,16 +103,12 @@ CString SystemErrorText(DWORD code) {
 }
 
 CString ComputerName() {
-  std::vector<wchar_t> name(MAX_COMPUTERNAME_LENGTH + 1);
-  DWORD size = static_cast<DWORD>(name.size());
-  if (!GetComputerNameW(name.data(), &size)) {
-    // Longer names than NetBIOS allows exist; size now holds what the name needs.
-    if (GetLastError() != ERROR_BUFFER_OVERFLOW) return CString();
-    name.resize(size + 1);
-    size = static_cast<DWORD>(name.size());
-    if (!GetComputerNameW(name.data(), &size)) return CString();
-  }
-  return CString(name.data(), size);
+  // The NetBIOS name's own limit: a longer name does not fit and reads as none, in the tree label
+  // and the report alike, rather than one showing a name the other cannot.
+  wchar_t name[MAX_COMPUTERNAME_LENGTH + 1] = {};
+  DWORD size = MAX_COMPUTERNAME_LENGTH + 1;
+  if (!GetComputerNameW(name, &size)) return CString();
+  return CString(name, size);
 }
 
 }  // namespace fw

@@ -40,7 +40,7 @@ CString ToUpper(const CString& text);
 // The system's description of a Win32 error code or HRESULT, in the user's language and without
 // its trailing line break; empty when the system has none.
 CString SystemErrorText(DWORD code);
-// The computer's name, also one longer than NetBIOS allows; empty when it cannot be had.
+// The computer's NetBIOS name (at most 15 characters); empty for a longer one or when it cannot be had.
 CString ComputerName();
 
 }  // namespace fw
