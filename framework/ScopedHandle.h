@@ -73,71 +73,31 @@ struct FindHandleTraits {
 };
 using ScopedFindHandle = UniqueHandle<FindHandleTraits>;
 
+// Handles for which null is the only "none", released by Closer. The closers are taken by address
+// as the system declares them, calling convention and all.
+template <class H, auto Closer>
+struct NullHandleTraits {
+  using Handle = H;
+  static Handle Invalid() { return nullptr; }
+  static bool IsValid(Handle handle) { return handle != nullptr; }
+  static void Close(Handle handle) { Closer(handle); }
+};
+
 // Memory the system allocated with LocalAlloc for the caller (FormatMessageW with
 // FORMAT_MESSAGE_ALLOCATE_BUFFER, CommandLineToArgvW), typed as what it holds.
 template <class T>
-struct LocalMemoryTraits {
-  using Handle = T*;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ::LocalFree(handle); }
-};
-template <class T>
-using ScopedLocalMemory = UniqueHandle<LocalMemoryTraits<T>>;
-
+using ScopedLocalMemory = UniqueHandle<NullHandleTraits<T*, &::LocalFree>>;
 // Movable global memory (streams on HGLOBAL).
-struct GlobalMemoryTraits {
-  using Handle = HGLOBAL;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ::GlobalFree(handle); }
-};
-using ScopedGlobalMemory = UniqueHandle<GlobalMemoryTraits>;
-
-// GDI objects: bitmaps, brushes, fonts.
-template <class T>
-struct GdiObjectTraits {
-  using Handle = T;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ::DeleteObject(handle); }
-};
-using ScopedBitmap = UniqueHandle<GdiObjectTraits<HBITMAP>>;
-
+using ScopedGlobalMemory = UniqueHandle<NullHandleTraits<HGLOBAL, &::GlobalFree>>;
+// GDI bitmaps.
+using ScopedBitmap = UniqueHandle<NullHandleTraits<HBITMAP, &::DeleteObject>>;
 // Libraries loaded at run time.
-struct LibraryTraits {
-  using Handle = HMODULE;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ::FreeLibrary(handle); }
-};
-using ScopedLibrary = UniqueHandle<LibraryTraits>;
-
+using ScopedLibrary = UniqueHandle<NullHandleTraits<HMODULE, &::FreeLibrary>>;
 // Image lists of the common controls.
-struct ImageListTraits {
-  using Handle = HIMAGELIST;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ImageList_Destroy(handle); }
-};
-using ScopedImageList = UniqueHandle<ImageListTraits>;
-
+using ScopedImageList = UniqueHandle<NullHandleTraits<HIMAGELIST, &::ImageList_Destroy>>;
 // Texts a COM call hands out as BSTR.
-struct BstrTraits {
-  using Handle = BSTR;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ::SysFreeString(handle); }
-};
-using ScopedBstr = UniqueHandle<BstrTraits>;
-
+using ScopedBstr = UniqueHandle<NullHandleTraits<BSTR, &::SysFreeString>>;
 // Shell item lists (PIDLs), which belong to the shell's allocator, the COM task allocator.
-struct ItemListTraits {
-  using Handle = PIDLIST_ABSOLUTE;
-  static Handle Invalid() { return nullptr; }
-  static bool IsValid(Handle handle) { return handle != nullptr; }
-  static void Close(Handle handle) { ::CoTaskMemFree(handle); }
-};
-using ScopedItemList = UniqueHandle<ItemListTraits>;
+using ScopedItemList = UniqueHandle<NullHandleTraits<PIDLIST_ABSOLUTE, &::CoTaskMemFree>>;
 
 }  // namespace fw
