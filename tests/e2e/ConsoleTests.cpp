@@ -16,19 +16,8 @@ constexpr wchar_t kSuiteKey[] = L"SOFTWARE\\KVEL";
 constexpr wchar_t kPortalKey[] = L"Software\\KVEL\\Mapora Connection\\Settings";
 constexpr wchar_t kPackFile[] = L"\\ResMaporaAdmin.dll";
 constexpr wchar_t kHelpFile[] = L"\\administering_mapora_desktop.chm";
-constexpr DWORD kAbsent = 0xFFFFFFFF;
 
-DWORD StoredForUser(const wchar_t* key, const wchar_t* name) {
-  DWORD value = 0;
-  if (!ReadDword(HKEY_CURRENT_USER, key, name, value)) return kAbsent;
-  return value;
-}
-
-std::wstring Environment(const wchar_t* name) {
-  wchar_t value[MAX_PATH] = L"";
-  GetEnvironmentVariableW(name, value, MAX_PATH);
-  return value;
-}
+DWORD StoredForUser(const wchar_t* key, const wchar_t* name) { return StoredDword(HKEY_CURRENT_USER, key, name); }
 
 // The console as installed, on a German Windows (LANG de_DE) that no pack serves: a copy in the
 // 32-bit common program files folder (only there does "Advanced..." show); Desktop with an Austrian
@@ -65,7 +54,7 @@ class Console : public testing::Test {
   ScopedDirectory m_desktopFolder{ModuleFolder() + L"\\e2e-desktop"};
   ScopedDirectory m_french{MaporaCommonFolder() + L"\\bin\\fr"};
   ScopedDirectory m_arabic{MaporaCommonFolder() + L"\\bin\\ar"};
-  ScopedDirectory m_shared{Environment(L"CommonProgramFiles(x86)") + L"\\e2e"};
+  ScopedDirectory m_shared{EnvironmentVariable(L"CommonProgramFiles(x86)") + L"\\e2e"};
   std::unique_ptr<Process> m_console;
 };
 
@@ -93,7 +82,7 @@ TEST_F(Console, MainWindowInTheLanguageOfThePackWithItsHelp) {
     ASSERT_NE(main, nullptr);
     HWND page = FindWindowExW(main, nullptr, L"#32770", nullptr);
     EXPECT_EQ(Text(main), row.title);
-    EXPECT_EQ(TreeRootText(Control(main, IDC_PAGE_TREE)), L"Mapora (" + Environment(L"COMPUTERNAME") + L")");
+    EXPECT_EQ(TreeRootText(Control(main, IDC_PAGE_TREE)), L"Mapora (" + EnvironmentVariable(L"COMPUTERNAME") + L")");
     EXPECT_EQ(Text(Control(page, IDC_REPORT_LABEL)), row.reportLabel);
     EXPECT_EQ((GetWindowLongPtrW(main, GWL_EXSTYLE) & WS_EX_LAYOUTRTL) != 0, row.rightToLeft);
     EXPECT_EQ((GetWindowLongPtrW(page, GWL_EXSTYLE) & WS_EX_LAYOUTRTL) != 0, row.rightToLeft);

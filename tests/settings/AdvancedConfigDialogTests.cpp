@@ -12,18 +12,13 @@
 
 namespace {
 
+using testing_support::kAbsent;
 using testing_support::SetRegistryDword;
 using testing_support::SetRegistryString;
+using testing_support::StoredDword;
 
 constexpr wchar_t kDesktopKey[] = L"SOFTWARE\\KVEL\\Desktop10.5";
-constexpr DWORD kAbsent = 0xFFFFFFFF;
 const std::wstring kKueiKey = EnableKueiKey(kDesktopKey);
-
-DWORD Stored(HKEY root, const std::wstring& key, const wchar_t* name) {
-  DWORD value = 0;
-  if (!testing_support::ReadDword(root, key, name, value)) return kAbsent;
-  return value;
-}
 
 std::function<void(HWND)> g_whileOpen;  // the running test's look at the open dialog
 
@@ -74,7 +69,7 @@ class Workstation : public AdminSession {
         if (!IsWindowEnabled(e2e::Control(dialog, id))) m_disabled.push_back(id);
         if (IsDlgButtonChecked(dialog, id) == BST_CHECKED) m_checked.push_back(id);
       }
-      m_languageWhileOpen = Stored(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue);
+      m_languageWhileOpen = StoredDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue);
       // Removed behind the dialog's back: afterwards the value is the one its closing wrote.
       RegDeleteKeyValueW(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue);
       if (row.entry >= 0) e2e::SelectCombo(list, row.entry);
@@ -129,9 +124,9 @@ TEST(AdvancedConfiguration, ShowsTheWorkstationAndWritesWhatTheButtonSays) {
     EXPECT_EQ(workstation.m_disabled, row.disabled);
     EXPECT_EQ(workstation.m_checked, row.checked);
     EXPECT_EQ(workstation.m_languageWhileOpen, row.languageWhileOpen);
-    EXPECT_EQ(Stored(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue), row.savedLanguage);
-    EXPECT_EQ(Stored(HKEY_LOCAL_MACHINE, kKueiKey, kEnableKueiValue), row.savedKuei);
-    EXPECT_EQ(Stored(HKEY_CURRENT_USER, kConnectionSettingsKey, kSupportLocalPortalValue), row.savedPortal);
+    EXPECT_EQ(StoredDword(HKEY_CURRENT_USER, kSuiteUserKey, kUILangIDValue), row.savedLanguage);
+    EXPECT_EQ(StoredDword(HKEY_LOCAL_MACHINE, kKueiKey, kEnableKueiValue), row.savedKuei);
+    EXPECT_EQ(StoredDword(HKEY_CURRENT_USER, kConnectionSettingsKey, kSupportLocalPortalValue), row.savedPortal);
     EXPECT_EQ(fw::RegistryKey().Open(HKEY_CURRENT_USER, kConnectionSettingsKey), ERROR_SUCCESS) << "made on opening";
   }
 }

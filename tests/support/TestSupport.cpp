@@ -32,17 +32,6 @@ std::string Narrow(const std::wstring& text) {
   return narrow;
 }
 
-void SetValue(HKEY root, const std::wstring& path, REGSAM view, const wchar_t* name, DWORD type, const void* data,
-              DWORD size) {
-  HKEY key = nullptr;
-  const std::string what = Narrow(path) + " " + Narrow(name ? name : L"(default)");
-  if (!CheckStatus(RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr),
-                   "creating " + what))
-    return;
-  CheckStatus(RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size), "setting " + what);
-  RegCloseKey(key);
-}
-
 void RemoveTree(const std::wstring& path) {
   // The shell's delete takes a list ended by an empty entry.
   std::wstring from = path + L'\0';
@@ -105,19 +94,6 @@ ScopedRegistryKey::ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view)
 
 ScopedRegistryKey::~ScopedRegistryKey() { DeleteKeyTree(root_, path_, view_); }
 
-void ScopedRegistryKey::SetString(const wchar_t* name, const std::wstring& value, DWORD type) {
-  SetValue(root_, path_, view_, name, type, value.c_str(),
-           static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
-}
-
-void ScopedRegistryKey::SetDword(const wchar_t* name, DWORD value) {
-  SetValue(root_, path_, view_, name, REG_DWORD, &value, sizeof value);
-}
-
-void ScopedRegistryKey::SetBinary(const wchar_t* name, const void* data, DWORD size, DWORD type) {
-  SetValue(root_, path_, view_, name, type, data, size);
-}
-
 void ScopedRegistryKey::DeleteValue(const wchar_t* name) {
   HKEY key = nullptr;
   if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_SET_VALUE | view_, &key) != ERROR_SUCCESS) return;
@@ -125,23 +101,31 @@ void ScopedRegistryKey::DeleteValue(const wchar_t* name) {
   RegCloseKey(key);
 }
 
-void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value) {
-  SetValue(root, path, 0, name, REG_SZ, value.c_str(), static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)));
-}
-
-void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value) {
-  SetValue(root, path, 0, name, REG_DWORD, &value, sizeof value);
-}
-
 void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, DWORD type, const void* data,
-                      DWORD size) {
-  SetValue(root, path, 0, name, type, data, size);
+                      DWORD size, REGSAM view) {
+  HKEY key = nullptr;
+  const std::string what = Narrow(path) + " " + Narrow(name ? name : L"(default)");
+  if (!CheckStatus(RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr, &key, nullptr),
+                   "creating " + what))
+    return;
+  CheckStatus(RegSetValueExW(key, name, 0, type, static_cast<const BYTE*>(data), size), "setting " + what);
+  RegCloseKey(key);
 }
 
-bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value) {
-  DWORD type = 0, size = sizeof value;
-  return RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, &type, &value, &size) == ERROR_SUCCESS &&
-         type == REG_DWORD && size == sizeof value;
+void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value, DWORD type,
+                       REGSAM view) {
+  SetRegistryBytes(root, path, name, type, value.c_str(), static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)), view);
+}
+
+void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value, REGSAM view) {
+  SetRegistryBytes(root, path, name, REG_DWORD, &value, sizeof value, view);
+}
+
+DWORD StoredDword(HKEY root, const std::wstring& path, const wchar_t* name) {
+  DWORD type = 0, value = 0, size = sizeof value;
+  const bool stored = RegGetValueW(root, path.c_str(), name, RRF_RT_ANY, &type, &value, &size) == ERROR_SUCCESS &&
+                      type == REG_DWORD && size == sizeof value;
+  return stored ? value : kAbsent;
 }
 
 bool CopyFileTo(const std::wstring& from, const std::wstring& to) {
@@ -188,6 +172,12 @@ std::wstring MaporaCommonFolder() {
   wchar_t path[MAX_PATH] = L"";
   SHGetSpecialFolderPathW(nullptr, path, CSIDL_PROGRAM_FILES_COMMON, FALSE);
   return std::wstring(path) + L"\\Mapora";
+}
+
+std::wstring EnvironmentVariable(const wchar_t* name) {
+  wchar_t value[MAX_PATH] = L"";
+  GetEnvironmentVariableW(name, value, MAX_PATH);
+  return value;
 }
 
 std::wstring ModuleFolder() {

@@ -26,7 +26,6 @@ class ScopedRegistryKey {
 
   void SetString(const wchar_t* name, const std::wstring& value, DWORD type = REG_SZ);
   void SetDword(const wchar_t* name, DWORD value);
-  void SetBinary(const wchar_t* name, const void* data, DWORD size, DWORD type = REG_BINARY);
   void DeleteValue(const wchar_t* name);
 
  private:
@@ -54,15 +53,24 @@ class ScopedHiveOverride {
   HKEY classes_ = nullptr;
 };
 
-// Write a value, creating its key and the key's parents. Meant for tests under
-// ScopedHiveOverride, where nothing written needs removing afterwards.
-void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value);
-void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value);
+// Write a value, creating its key and the key's parents (in the registry view given). Meant for
+// tests under ScopedHiveOverride, where nothing written needs removing afterwards.
 void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, DWORD type, const void* data,
-                      DWORD size);
+                      DWORD size, REGSAM view = 0);
+void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value,
+                       DWORD type = REG_SZ, REGSAM view = 0);
+void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value, REGSAM view = 0);
 
-// Reads a DWORD value; false when the key or value is missing or not a DWORD (no failure).
-bool ReadDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD& value);
+inline void ScopedRegistryKey::SetString(const wchar_t* name, const std::wstring& value, DWORD type) {
+  SetRegistryString(root_, path_, name, value, type, view_);
+}
+inline void ScopedRegistryKey::SetDword(const wchar_t* name, DWORD value) {
+  SetRegistryDword(root_, path_, name, value, view_);
+}
+
+// A stored DWORD value; kAbsent when the key or value is missing or not a DWORD (no failure).
+constexpr DWORD kAbsent = 0xFFFFFFFF;
+DWORD StoredDword(HKEY root, const std::wstring& path, const wchar_t* name);
 
 // What a format text consumes, in order: printf conversions ("%-5ls" gives "%ls"), message inserts
 // ("%1" to "%99") and any stray "%"; "%%" is none.
@@ -93,5 +101,7 @@ bool CopyFileTo(const std::wstring& from, const std::wstring& to);
 std::wstring MaporaCommonFolder();
 // Folder of the running test program.
 std::wstring ModuleFolder();
+// An environment variable of this process; "" when unset.
+std::wstring EnvironmentVariable(const wchar_t* name);
 
 }  // namespace testing_support
