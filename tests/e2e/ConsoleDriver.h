@@ -123,18 +123,12 @@ class Process {
       return GetDlgItem(window, IDC_PAGE_TREE) == nullptr && Text(window) == *caption;
     }};
     // EnumWindows answers false once the search stops at a match.
-    if (!WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)) || !Running(); })) {
-      const DWORD waitError = GetLastError();
-      DWORD exitCode = 0;
-      GetExitCodeProcess(m_process, &exitCode);
-      std::fprintf(stderr, "no window %ls after %lu ms: exit code %lu (%lu: still running), last error %lu\n",
+    WaitUntil([&] { return !EnumWindows(MatchWindow, reinterpret_cast<LPARAM>(&search)) || !Running(); });
+    DWORD exitCode = 0;
+    if (search.found == nullptr && GetExitCodeProcess(m_process, &exitCode))
+      std::fprintf(stderr, "no window %ls within %lu ms: exit code %lu (%lu: still running)\n",
                    caption ? caption->c_str() : L"with the page tree", kWaitMs, exitCode,
-                   static_cast<unsigned long>(STILL_ACTIVE), waitError);
-    } else if (search.found == nullptr) {
-      DWORD exitCode = 0;
-      GetExitCodeProcess(m_process, &exitCode);
-      std::fprintf(stderr, "the process ended with exit code %lu before showing the window\n", exitCode);
-    }
+                   static_cast<unsigned long>(STILL_ACTIVE));
     return search.found;
   }
 
