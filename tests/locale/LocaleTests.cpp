@@ -20,21 +20,6 @@ using namespace testing_support;
 
 namespace {
 
-TEST(GetLangIDFromName, PackFolderNamesMatchSupportedLocales) {
-  const struct { const char* name; const wchar_t* folder; unsigned short langId; } rows[] = {
-      {"a language names its primary language", L"fr", 0x000C},
-      {"language and country, in any letter case, name the whole locale", L"FR-ca", 0x0C0C},
-      {"an unknown language", L"xx", 0},
-      {"a dangling hyphen", L"fr-", 0},
-      {"no name", nullptr, 0},
-  };
-  for (const auto& row : rows) {
-    unsigned short langId = 0xFFFF;
-    EXPECT_EQ(GetLangIDFromName(row.folder, langId), row.langId != 0) << row.name;
-    EXPECT_EQ(langId, row.langId) << row.name;
-  }
-}
-
 // The scenarios show the packs a locale with a country name has under a known base.
 TEST(ChooseLanguagePacks, KeepsThePacksThatCount) {
   const struct { const char* name; const wchar_t *base, *country, *pack; std::wstring kept; } rows[] = {
