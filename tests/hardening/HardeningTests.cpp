@@ -63,7 +63,8 @@ TEST_P(BrokenPack, ConsoleOpensEveryWindow) {
   const auto [without, firstEnglish] = GetParam();
   const auto title = [&](int window) { return window < firstEnglish ? kFrench[window] : kEnglish[window]; };
   ScopedDirectory pack(MaporaCommonFolder() + L"\\bin\\fr"), desktop(ModuleFolder() + L"\\broken-pack-desktop");
-  ScopedDirectory shared(EnvironmentVariable(L"CommonProgramFiles(x86)") + L"\\broken-pack");  // where the console offers "Advanced..."
+  ScopedDirectory shared(EnvironmentVariable(L"CommonProgramFiles(x86)") +
+                         L"\\broken-pack");  // where the console offers "Advanced..."
   ScopedRegistryKey desktopKey(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Desktop10.5");
   ScopedRegistryKey user(HKEY_CURRENT_USER, L"SOFTWARE\\KVEL");
   desktopKey.SetString(L"InstallDir", desktop.Path());

@@ -114,7 +114,8 @@ void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, 
 
 void SetRegistryString(HKEY root, const std::wstring& path, const wchar_t* name, const std::wstring& value, DWORD type,
                        REGSAM view) {
-  SetRegistryBytes(root, path, name, type, value.c_str(), static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)), view);
+  SetRegistryBytes(root, path, name, type, value.c_str(), static_cast<DWORD>((value.size() + 1) * sizeof(wchar_t)),
+                   view);
 }
 
 void SetRegistryDword(HKEY root, const std::wstring& path, const wchar_t* name, DWORD value, REGSAM view) {
