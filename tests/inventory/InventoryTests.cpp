@@ -79,15 +79,8 @@ TEST(RegistryKey, TypedReadsRefuseOtherTypesLenientOnesDoNot) {
   }
 }
 
-TEST(GetInstallDir, EnginesFolderFromItsOwnKey) {
-  ScopedHiveOverride hives;
-  SetRegistryString(HKEY_LOCAL_MACHINE, kEngineKey, L"InstallDir", L"D:\\Engine");
-  std::wstring installDir;
-  EXPECT_EQ(GetInstallDir(static_cast<int>(ProductKind::Engine), L"10.5", installDir), true);
-  EXPECT_EQ(installDir, L"D:\\Engine");
-}
-
-// Every value holds its own name: Engine's key has them all, Desktop reads its image elsewhere.
+// Every value holds its own name: Engine's key has them all, Desktop reads its image elsewhere. The help
+// path's folder lookup reads the same key.
 TEST(ReadProductInstallInfo, EachFieldFromItsValueOrTheReportsDefault) {
   ScopedHiveOverride hives;
   for (const wchar_t* name : {L"InstallDir", L"Installer", L"ProductName", L"ImageLocation", L"SourceDir",
@@ -109,6 +102,9 @@ TEST(ReadProductInstallInfo, EachFieldFromItsValueOrTheReportsDefault) {
             L"SPInstaller|SPInstallDate|SPInstallTime|SPStatus|SPDisplayName|?|");
   EXPECT_EQ(ReadProductInstallInfo(ProductKind::Desktop, kEngineKey).imageLocation, L"ImageLocation");
   EXPECT_EQ(fields(ProductKind::Desktop, kDesktopKey), L"|||||||0|0|N/A|N/A|N/A|N/A||?|") << "no key";
+  std::wstring installDir;
+  EXPECT_EQ(GetInstallDir(static_cast<int>(ProductKind::Engine), L"10.5", installDir), true);
+  EXPECT_EQ(installDir, L"InstallDir");
 }
 
 TEST(GetCoreProductVersion, OnlyFromTheUsEnglishUnicodeTable) {

@@ -52,10 +52,6 @@ TEST(ComposeInstallationReport, InstalledProductsInFixedOrderWithTheirHeadingsEm
   for (const auto& row : rows) EXPECT_EQ(Marked(ComposeInstallationReport(row.input, kTexts)), row.marked) << row.name;
 }
 
-TEST(RichEditOffset, OnlyTheLineBreaksBeforeTheOffsetCountAsOneCharacter) {
-  EXPECT_EQ(RichEditOffset(L"a\r\nb\r\nc", 3), 2u);
-}
-
 TEST(OffersAdvancedSettings, ForDesktopOrEngineInsideTheSharedProgramFolder) {
   const std::wstring common = L"C:\\Program Files (x86)\\Common Files", inside = common + L"\\Mapora\\Admin.exe";
   const struct { const char* name; bool desktopOrEngine; std::wstring commonFiles, program; bool offered; } rows[] = {
@@ -86,7 +82,8 @@ TEST(WorkstationPage, ShowsTheReportWithItsHeadingsBoldInTheHighlightColour) {
 
   const InstallationReport report =
       ComposeInstallationReport(ReadReportInput(admin.m_installedProducts), LoadReportTexts());
-  auto formatOf = [edit = page.GetDlgItem(IDC_REPORT)](size_t from, size_t to) {
+  const HWND edit = page.GetDlgItem(IDC_REPORT);
+  auto select = [edit](size_t from, size_t to) {  // the selection's format
     CHARRANGE range = {static_cast<LONG>(from), static_cast<LONG>(to)};
     CHARFORMAT2W format = {};
     format.cbSize = sizeof format;
@@ -96,10 +93,14 @@ TEST(WorkstationPage, ShowsTheReportWithItsHeadingsBoldInTheHighlightColour) {
   };
   for (const TextRange& range : report.emphasis) {
     const size_t start = RichEditOffset(report.text, range.start), end = start + range.length;
-    EXPECT_EQ(formatOf(start, end).dwMask & CFM_BOLD, static_cast<DWORD>(CFM_BOLD)) << "partly bold at " << start;
-    EXPECT_EQ(formatOf(start, end).dwEffects & CFE_BOLD, static_cast<DWORD>(CFE_BOLD)) << "not bold at " << start;
-    EXPECT_EQ(formatOf(start, end).crTextColor, GetSysColor(COLOR_HIGHLIGHT)) << start;
-    EXPECT_EQ(formatOf(end, end + 1).dwEffects & CFE_BOLD, 0u) << "bold after " << start;
+    const CHARFORMAT2W format = select(start, end);
+    wchar_t selected[256] = L"";
+    SendMessageW(edit, EM_GETSELTEXT, 0, reinterpret_cast<LPARAM>(selected));
+    EXPECT_EQ(std::wstring(selected), report.text.substr(range.start, range.length)) << "emphasis at " << start;
+    EXPECT_EQ(format.dwMask & CFM_BOLD, static_cast<DWORD>(CFM_BOLD)) << "partly bold at " << start;
+    EXPECT_EQ(format.dwEffects & CFE_BOLD, static_cast<DWORD>(CFE_BOLD)) << "not bold at " << start;
+    EXPECT_EQ(format.crTextColor, GetSysColor(COLOR_HIGHLIGHT)) << start;
+    EXPECT_EQ(select(end, end + 1).dwEffects & CFE_BOLD, 0u) << "bold after " << start;
   }
 }
 
