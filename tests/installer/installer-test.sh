@@ -101,7 +101,6 @@ lifecycle() {
   checks <<'EOF'
 installed console's window shown|yes|console_shown
 console|yes|exists "$bin\\MaporaAdmin.exe"
-report|yes|exists "$bin\\MaporaReport.exe"
 language packs|ar de es fr ja zh-CN|installed_packs
 policy templates (off by default)|no|exists 'C:\windows\PolicyDefinitions\Mapora.admx'
 Start-menu shortcut|yes|exists "$lnk\\Mapora Administrator.lnk"
