@@ -1,5 +1,5 @@
-// The console against what it finds on a workstation: a broken language pack, the state the
-// machine-settings probe meets, libraries planted where it must not look for them.
+// The console against what it finds on a workstation: the state the machine-settings probe meets,
+// libraries planted where it must not look for them.
 #include <gtest/gtest.h>
 
 #include "settings/AdvancedSettings.h"
@@ -47,53 +47,6 @@ const char* const kStartingStates[] = {"Nothing", "ClassKeyOnly", "WithCategorie
 INSTANTIATE_TEST_SUITE_P(StartingStates, MachineSettingsProbe, testing::Range(0, 4),
                          [](const testing::TestParamInfo<int>& info) {
                            return std::string(kStartingStates[info.param]);
-                         });
-
-// The main window, its page, the About box and Advanced Configuration, in the order a user meets them.
-const wchar_t* const kFrench[] = {L"Administrateur Mapora", L"Informations de configuration de Mapora :",
-                                  L"\u00c0 propos de l'Administrateur Mapora", L"Configuration avanc\u00e9e"};
-const wchar_t* const kEnglish[] = {L"Mapora Administrator", L"Mapora Configuration Information:",
-                                   L"About Mapora Administrator", L"Advanced Configuration"};
-
-// A French pack without one template (null: the shipped pack), and the first window shown in English.
-class BrokenPack : public testing::TestWithParam<std::pair<const wchar_t*, int>> {};
-
-// The console still opens every window: in French as long as the pack serves, then in English.
-TEST_P(BrokenPack, ConsoleOpensEveryWindow) {
-  const auto [without, firstEnglish] = GetParam();
-  const auto title = [&](int window) { return window < firstEnglish ? kFrench[window] : kEnglish[window]; };
-  ScopedDirectory pack(MaporaCommonFolder() + L"\\bin\\fr"), desktop(ModuleFolder() + L"\\broken-pack-desktop");
-  ScopedDirectory shared(EnvironmentVariable(L"CommonProgramFiles(x86)") +
-                         L"\\broken-pack");  // where the console offers "Advanced..."
-  ScopedRegistryKey desktopKey(HKEY_LOCAL_MACHINE, L"SOFTWARE\\KVEL\\Desktop10.5");
-  ScopedRegistryKey user(HKEY_CURRENT_USER, L"SOFTWARE\\KVEL");
-  desktopKey.SetString(L"InstallDir", desktop.Path());
-  const std::wstring source =
-      without ? WindowsPath(HARDENING_PACKS_DIR) + L"\\" + without : WindowsPath(MAPORA_PACKS_DIR) + L"\\fr";
-  ASSERT_TRUE(CopyFileTo(source + L"\\ResMaporaAdmin.dll", pack.Path() + L"\\ResMaporaAdmin.dll"));
-  ASSERT_TRUE(CopyFileTo(ConsolePath(), shared.Path() + L"\\MaporaAdmin.exe"));
-  Process console(L"/Lang 1036", shared.Path() + L"\\MaporaAdmin.exe", {L"KVEL_DESKTOP10.5_INSTALLED=1"});
-  HWND main = console.WaitForMainWindow();
-  ASSERT_NE(main, nullptr);
-  EXPECT_EQ(Text(main), title(0));
-  HWND page = FindWindowExW(main, nullptr, L"#32770", nullptr);
-  EXPECT_EQ(Text(Control(page, IDC_REPORT_LABEL)), title(1));
-  PostMessageW(main, WM_SYSCOMMAND, IDM_ABOUTBOX, 0);
-  HWND about = console.WaitForWindow(title(2));
-  ASSERT_NE(about, nullptr);
-  Click(about, IDOK);
-  ASSERT_TRUE(WaitUntil([&] { return !IsWindow(about); }));
-  ASSERT_TRUE(WaitUntil([&] { return IsWindowVisible(Control(page, IDC_ADVANCED)) != FALSE; }));
-  Click(page, IDC_ADVANCED);
-  EXPECT_NE(console.WaitForWindow(title(3)), nullptr);
-}
-
-INSTANTIATE_TEST_SUITE_P(Templates, BrokenPack,
-                         testing::Values(std::make_pair(nullptr, 4), std::make_pair(L"IDD_MAPORAADMIN_DIALOG", 0),
-                                         std::make_pair(L"IDD_MAPORA_CONFIG", 1), std::make_pair(L"IDD_ABOUTBOX", 2),
-                                         std::make_pair(L"IDD_ADVANCED_CONFIG", 3)),
-                         [](const testing::TestParamInfo<std::pair<const wchar_t*, int>>& info) {
-                           return info.param.first ? Name(info.param.first).substr(4) : "Complete";
                          });
 
 // Planted beside a copy of the console and in its working folder, under the name of a system library
