@@ -34,11 +34,6 @@ TEST(DecideInstalledProducts, FromMarkersAndRuntimesOfTheConsolesOwnRelease) {
   }
 }
 
-TEST(DistinctRuntimeVersions, DesktopAndEngineVersionsOnceEachInOrder) {
-  EXPECT_EQ(DistinctRuntimeVersions({{1, L"10.6-Beta"}, {3, L"9.0"}, {2, L"10.6-BETA"}, {0, L"10.4"}, {2, L"10.5a"}}),
-            (std::vector<std::wstring>{L"10.6-Beta", L"10.5a"}));
-}
-
 // Typed reads take only their own type and size and leave the preset alone otherwise; the lenient
 // reads take any type, as the console's rules do (an installer may write a folder as a DWORD).
 TEST(RegistryKey, TypedReadsRefuseOtherTypesLenientOnesDoNot) {
