@@ -91,8 +91,8 @@ TEST_F(Console, EveryWindowInTheLanguageOfThePackWithItsHelp) {
   for (const auto& row : rows) {
     SCOPED_TRACE(row.name);
     const auto text = [&](int index) { return (index < row.firstEnglish ? row.language : kEnglish)[index]; };
-    const std::wstring pack = row.without ? WindowsPath(E2E_BROKEN_PACKS_DIR) + L"\\" + row.without
-                                          : WindowsPath(MAPORA_PACKS_DIR) + L"\\fr";
+    const std::wstring pack =
+        row.without ? WindowsPath(E2E_BROKEN_PACKS_DIR) + L"\\" + row.without : WindowsPath(MAPORA_PACKS_DIR) + L"\\fr";
     m_console.reset();  // the last run's console holds its pack open
     ASSERT_TRUE(CopyFileTo(pack + kPackFile, m_french.Path() + kPackFile));
     HWND main = Launch(row.arguments);

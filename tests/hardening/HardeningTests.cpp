@@ -2,6 +2,8 @@
 // libraries planted where it must not look for them.
 #include <gtest/gtest.h>
 
+#include <iterator>
+
 #include "settings/AdvancedSettings.h"
 #include "tests/e2e/ConsoleDriver.h"
 #include "tests/support/TestSupport.h"
@@ -10,8 +12,6 @@ using namespace e2e;
 using namespace testing_support;
 
 namespace {
-
-std::string Name(const wchar_t* text) { return std::string(text, text + wcslen(text)); }
 
 // The probe key's path under HKEY_CLASSES_ROOT, from the class key down.
 const std::wstring kClassKey = L"CLSID\\{EACA595B-B64B-4B80-91AF-DD4517EB4ABC}";
@@ -28,39 +28,33 @@ std::vector<bool> ProbePathPresent() {
   return present;
 }
 
-// Row n: the first n keys of the path exist at the start.
-class MachineSettingsProbe : public testing::TestWithParam<int> {};
-
-TEST_P(MachineSettingsProbe, LeavesTheClassKeyAsFound) {
-  ScopedRegistryKey cleanup(HKEY_CLASSES_ROOT, kClassKey);
-  HKEY key = nullptr;
-  if (GetParam() > 0) {
-    ASSERT_EQ(RegCreateKeyW(HKEY_CLASSES_ROOT, kProbePath[GetParam() - 1].c_str(), &key), ERROR_SUCCESS);
-    RegCloseKey(key);
+// None, some or all of the path's keys present at the start: the probe leaves them as it found them.
+TEST(MachineSettingsProbe, LeavesTheClassKeyAsFound) {
+  for (size_t present = 0; present <= std::size(kProbePath); ++present) {
+    SCOPED_TRACE(testing::Message() << "the first " << present << " keys of the path present");
+    ScopedRegistryKey cleanup(HKEY_CLASSES_ROOT, kClassKey);
+    HKEY key = nullptr;
+    if (present > 0) {
+      ASSERT_EQ(RegCreateKeyW(HKEY_CLASSES_ROOT, kProbePath[present - 1].c_str(), &key), ERROR_SUCCESS);
+      RegCloseKey(key);
+    }
+    const std::vector<bool> before = ProbePathPresent();
+    EXPECT_TRUE(CanWriteMachineSettings());  // no suite application runs here
+    EXPECT_EQ(ProbePathPresent(), before);
   }
-  const std::vector<bool> before = ProbePathPresent();
-  EXPECT_TRUE(CanWriteMachineSettings());  // no suite application runs here
-  EXPECT_EQ(ProbePathPresent(), before);
 }
 
-const char* const kStartingStates[] = {"Nothing", "ClassKeyOnly", "WithCategories", "FullProbeKey"};
-INSTANTIATE_TEST_SUITE_P(StartingStates, MachineSettingsProbe, testing::Range(0, 4),
-                         [](const testing::TestParamInfo<int>& info) {
-                           return std::string(kStartingStates[info.param]);
-                         });
-
-// Planted beside a copy of the console and in its working folder, under the name of a system library
-// the console uses: the library never runs and the console opens as usual. version.dll is not among
-// them: under Wine a planted copy runs before the console's first instruction, as Wine's own user32
-// imports it; CheckImports.cmake checks that the console does not.
-class PlantedLibrary : public testing::TestWithParam<const wchar_t*> {};
-
-TEST_P(PlantedLibrary, NeverRuns) {
-  const std::wstring library = GetParam();
+// Planted beside a copy of the console and in its working folder, under the names of system libraries
+// the console uses: none of them runs and the console opens as usual. version.dll is not among them:
+// under Wine a planted copy runs before the console's first instruction, as Wine's own user32 imports
+// it; CheckImports.cmake checks that the console does not.
+TEST(PlantedLibrary, NeverRuns) {
+  const wchar_t* const libraries[] = {L"RICHED32.DLL", L"RICHED20.DLL", L"gdiplus.dll"};
   ScopedDirectory program(ModuleFolder() + L"\\planted-program"), work(ModuleFolder() + L"\\planted-work");
   ASSERT_TRUE(CopyFileTo(ConsolePath(), program.Path() + L"\\MaporaAdmin.exe"));
   for (const ScopedDirectory* folder : {&program, &work})
-    ASSERT_TRUE(CopyFileTo(WindowsPath(HARDENING_MARKERS_DIR) + L"\\" + library, folder->Path() + L"\\" + library));
+    for (const std::wstring library : libraries)
+      ASSERT_TRUE(CopyFileTo(WindowsPath(HARDENING_MARKERS_DIR) + L"\\" + library, folder->Path() + L"\\" + library));
   // Wine prefers its built-in libraries, Windows the first file its search finds; Wine takes its
   // overrides for a program started from a Windows process from the registry.
   ScopedRegistryKey appDefaults(HKEY_CURRENT_USER, L"Software\\Wine\\AppDefaults\\MaporaAdmin.exe");
@@ -77,13 +71,9 @@ TEST_P(PlantedLibrary, NeverRuns) {
   // The report is a rich edit control: the system's rich edit library was loaded after all.
   EXPECT_NE(GetDlgItem(FindWindowExW(main, nullptr, L"#32770", nullptr), IDC_REPORT), nullptr);
   for (const ScopedDirectory* folder : {&program, &work})
-    EXPECT_EQ(GetFileAttributesW((folder->Path() + L"\\" + library + L".ran").c_str()), INVALID_FILE_ATTRIBUTES)
-        << "loaded from " << folder->Path();
+    for (const std::wstring library : libraries)
+      EXPECT_EQ(GetFileAttributesW((folder->Path() + L"\\" + library + L".ran").c_str()), INVALID_FILE_ATTRIBUTES)
+          << library << " loaded from " << folder->Path();
 }
-
-INSTANTIATE_TEST_SUITE_P(Libraries, PlantedLibrary, testing::Values(L"RICHED32.DLL", L"RICHED20.DLL", L"gdiplus.dll"),
-                         [](const testing::TestParamInfo<const wchar_t*>& info) {
-                           return Name(info.param).substr(0, Name(info.param).find('.'));
-                         });
 
 }  // namespace
