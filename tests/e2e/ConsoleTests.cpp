@@ -156,7 +156,7 @@ TEST_F(Console, OKStoresTheLanguageOnceNoSuiteApplicationRuns) {
   m_user.SetDword(L"UILANGID", 0x0407);
   HWND main = Launch();
   ASSERT_NE(main, nullptr);
-  m_user.DeleteValue(L"UILANGID");
+  RegDeleteKeyValueW(HKEY_CURRENT_USER, kSuiteKey, L"UILANGID");
   {
     // waiting_process <semaphore to release> <process to outlive> <time limit>, as a suite application.
     Process tessera(L"none " + std::to_wstring(GetCurrentProcessId()) + L" 300000", m_shared.Path() + L"\\Tessera.exe");

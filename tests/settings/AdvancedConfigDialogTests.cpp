@@ -12,10 +12,7 @@
 
 namespace {
 
-using testing_support::kAbsent;
-using testing_support::SetRegistryDword;
-using testing_support::SetRegistryString;
-using testing_support::StoredDword;
+using namespace testing_support;
 
 constexpr wchar_t kDesktopKey[] = L"SOFTWARE\\KVEL\\Desktop10.5";
 const std::wstring kKueiKey = EnableKueiKey(kDesktopKey);
@@ -85,9 +82,8 @@ class Workstation : public AdminSession {
   DWORD m_languageWhileOpen = 0;
 
  private:
-  testing_support::ScopedHiveOverride m_hives;
-  testing_support::ScopedDirectory m_folders{testing_support::ModuleFolder() + L"\\advanced-config-" +
-                                             std::to_wstring(GetCurrentProcessId())};
+  ScopedHiveOverride m_hives;
+  ScopedDirectory m_folders{ModuleFolder() + L"\\advanced-config-" + std::to_wstring(GetCurrentProcessId())};
 };
 
 TEST(AdvancedConfiguration, ShowsTheWorkstationAndWritesWhatTheButtonSays) {

@@ -94,13 +94,6 @@ ScopedRegistryKey::ScopedRegistryKey(HKEY root, std::wstring path, REGSAM view)
 
 ScopedRegistryKey::~ScopedRegistryKey() { DeleteKeyTree(root_, path_, view_); }
 
-void ScopedRegistryKey::DeleteValue(const wchar_t* name) {
-  HKEY key = nullptr;
-  if (RegOpenKeyExW(root_, path_.c_str(), 0, KEY_SET_VALUE | view_, &key) != ERROR_SUCCESS) return;
-  RegDeleteValueW(key, name);
-  RegCloseKey(key);
-}
-
 void SetRegistryBytes(HKEY root, const std::wstring& path, const wchar_t* name, DWORD type, const void* data,
                       DWORD size, REGSAM view) {
   HKEY key = nullptr;

@@ -26,7 +26,6 @@ class ScopedRegistryKey {
 
   void SetString(const wchar_t* name, const std::wstring& value, DWORD type = REG_SZ);
   void SetDword(const wchar_t* name, DWORD value);
-  void DeleteValue(const wchar_t* name);
 
  private:
   HKEY root_;
