@@ -151,37 +151,6 @@ TEST(PolicyTemplate, EveryLanguageDefinesExactlyWhatTheTemplateUses) {
   }
 }
 
-// Names as the code reads them; a per-machine policy writes the WOW6432Node copy (where a 32-bit
-// program on 64-bit Windows reads the same key) alike, a per-user one writes none.
-TEST(PolicyTemplate, WritesOnlyTheValuesTheSuiteReadsInBothViews) {
-  const std::set<std::wstring> read{
-      fw::ToUpper(L"HKCU\\" + std::wstring(kSuiteUserKey) + L"\\" + kUILangIDValue),
-      fw::ToUpper(L"HKLM\\" + EnableKueiKey(DesktopKey()) + L"\\" + kEnableKueiValue),
-      fw::ToUpper(L"HKCU\\" + std::wstring(kConnectionSettingsKey) + L"\\" + kSupportLocalPortalValue),
-      fw::ToUpper(L"HKLM\\" + std::wstring(kPortalMachineSettingsKey) + L"\\" + kPortalServerSetByAdminValue)};
-  const Xml admx(L"Mapora.admx");
-  std::set<std::wstring> written;
-  for (const Node& policy : Select(admx, L"//p:policy")) {
-    for (const wchar_t* state : kStates) {
-      SCOPED_TRACE(String(policy.Get(), L"@name") + L": " + state);
-      Bag views[2];  // native, WOW6432Node
-      for (const Node& value : Select(policy.Get(), state)) {
-        RegistryWrite write = Write(value.Get(), Data(value.Get()));
-        const std::wstring wowSoftware = L"SOFTWARE\\WOW6432NODE\\";
-        const bool wow = write.key.compare(0, wowSoftware.size(), wowSoftware) == 0;
-        if (wow) write.key = L"SOFTWARE\\" + write.key.substr(wowSoftware.size());
-        const std::wstring name = write.Name();
-        EXPECT_EQ(read.count(name), 1u) << name;
-        EXPECT_NE(write.data, kUnread) << name;
-        written.insert(name);
-        views[wow].insert(write.Text());
-      }
-      EXPECT_EQ(views[1], String(policy.Get(), L"@class") == L"Machine" ? views[0] : Bag());
-    }
-  }
-  EXPECT_EQ(written, read);
-}
-
 // Each pack the build makes has its template language and its entry in the language list, which
 // offers what the console stores for English and each pack (for the Windows language: no value).
 TEST(PolicyTemplate, EveryPackIsTranslatedAndOffered) {
@@ -203,9 +172,11 @@ std::string Describe(const StoredSuiteSettings& settings) {
          ", locked " + (settings.portalServerSetByAdmin ? "yes" : "no");
 }
 
-// Each state of each policy written as the Group Policy client writes it, over no settings
-// (Enabled) or every setting on (Disabled), and read the one way the console and the report read
-// the settings. (What the console shows for them is the settings tests' matter.)
+// Each state of each policy written as the Group Policy client writes it, over no settings (Enabled) or every
+// setting on (Disabled), and read the one way the console and the report read the settings. Every value
+// written is one the code reads (names as it reads them) and every one it reads has its policy; a per-machine
+// policy writes the WOW6432Node copy (where a 32-bit program on 64-bit Windows reads the same key) alike, a
+// per-user one writes none. (What the console shows for them is the settings tests' matter.)
 TEST(PolicyConsole, ReadsEachStateAsThePolicySays) {
   const std::wstring chinese = std::to_wstring(LangId(L"zh-CN"));
   const struct { const wchar_t* policy; bool enabled; std::wstring values; std::string read; } rows[] = {
@@ -219,9 +190,16 @@ TEST(PolicyConsole, ReadsEachStateAsThePolicySays) {
       {L"PortalServerSetByAdmin", false, kStates[0], "language 7, programme on, local portal on, locked no"},
       {L"PortalServerSetByAdmin", true, kStates[1], "language none, programme off, local portal off, locked yes"},
   };
+  const std::set<std::wstring> read{
+      fw::ToUpper(L"HKCU\\" + std::wstring(kSuiteUserKey) + L"\\" + kUILangIDValue),
+      fw::ToUpper(L"HKLM\\" + EnableKueiKey(DesktopKey()) + L"\\" + kEnableKueiValue),
+      fw::ToUpper(L"HKCU\\" + std::wstring(kConnectionSettingsKey) + L"\\" + kSupportLocalPortalValue),
+      fw::ToUpper(L"HKLM\\" + std::wstring(kPortalMachineSettingsKey) + L"\\" + kPortalServerSetByAdminValue)};
   const Xml admx(L"Mapora.admx");
   InstalledProducts products;
   products.desktopKey = DesktopKey();
+  std::set<std::wstring> written;
+  Bag policies;
   for (const auto& row : rows) {
     SCOPED_TRACE(testing::Message() << row.policy << (row.enabled ? " enabled" : " disabled"));
     ScopedHiveOverride hives;
@@ -233,16 +211,30 @@ TEST(PolicyConsole, ReadsEachStateAsThePolicySays) {
     }
     const std::vector<Node> policy = Select(admx, L"//p:policy[@name='" + std::wstring(row.policy) + L"']");
     ASSERT_EQ(policy.size(), 1u);
+    policies.insert(row.policy);
+    Bag views[2];  // native, WOW6432Node
     for (const Node& value : Select(policy.front().Get(), row.values)) {
-      const RegistryWrite write = Write(value.Get(), Data(value.Get()));
+      RegistryWrite write = Write(value.Get(), Data(value.Get()));
       const HKEY root = write.machine ? HKEY_LOCAL_MACHINE : HKEY_CURRENT_USER;
       if (write.data == L"-")
         RegDeleteKeyValueW(root, write.key.c_str(), write.valueName.c_str());
       else
         SetRegistryDword(root, write.key, write.valueName.c_str(), std::wcstoul(write.data.c_str(), nullptr, 10));
+      const std::wstring wowSoftware = L"SOFTWARE\\WOW6432NODE\\";
+      const bool wow = write.key.compare(0, wowSoftware.size(), wowSoftware) == 0;
+      if (wow) write.key = L"SOFTWARE\\" + write.key.substr(wowSoftware.size());
+      EXPECT_EQ(read.count(write.Name()), 1u) << write.Name();
+      EXPECT_NE(write.data, kUnread) << write.Name();
+      written.insert(write.Name());
+      views[wow].insert(write.Text());
     }
+    EXPECT_EQ(views[1], String(policy.front().Get(), L"@class") == L"Machine" ? views[0] : Bag());
     EXPECT_EQ(Describe(ReadStoredSuiteSettings(products)), row.read);
   }
+  EXPECT_EQ(written, read);
+  Bag stated;  // each policy's Disabled and Enabled
+  for (const std::wstring& name : Strings(admx, L"//p:policy/@name")) stated.insert({name, name});
+  EXPECT_EQ(policies, stated);
 }
 
 }  // namespace
