@@ -51,6 +51,12 @@ bool IsDesktopOrEngine(long productCode) {
   return productCode == kSuiteRuntimeDesktop || productCode == kSuiteRuntimeEngine;
 }
 
+// Opens a product's key for reading in the view its values live in.
+LONG OpenProductKey(fw::RegistryKey& key, HKEY hive, const std::wstring& subkey) {
+  if (ReadsThe64BitView(subkey)) return key.Open(hive, subkey.c_str(), KEY_READ | KEY_WOW64_64KEY);
+  return key.Open(hive, subkey.c_str());
+}
+
 }  // namespace
 
 std::wstring GetProductVersion() { return kSuiteRelease; }
@@ -60,13 +66,8 @@ bool ReadsThe64BitView(const std::wstring& subkey) { return subkey.find(kSkyloft
 std::wstring ReadRegistryString(HKEY hive, const std::wstring& subkey, const std::wstring& valueName,
                                 const std::wstring& defaultText) {
   fw::RegistryKey key;
-  LONG opened;
-  if (ReadsThe64BitView(subkey))
-    opened = key.Open(hive, subkey.c_str(), KEY_READ | KEY_WOW64_64KEY);
-  else
-    opened = key.Open(hive, subkey.c_str());
   std::wstring result = defaultText;
-  if (opened == ERROR_SUCCESS) key.ReadAnyValueAsText(valueName.c_str(), result);
+  if (OpenProductKey(key, hive, subkey) == ERROR_SUCCESS) key.ReadAnyValueAsText(valueName.c_str(), result);
   return result;
 }
 
@@ -145,11 +146,14 @@ bool GetInstallDir(int productIndex, std::wstring version, std::wstring& install
 ProductInstallInfo ReadProductInstallInfo(ProductKind kind, const std::wstring& productKey) {
   // A default-constructed record holds each field's default.
   ProductInstallInfo info;
-  for (const InstallValue& value : kInstallValues) {
-    // Engine keeps its installation image under another name.
-    const bool engineImage = kind == ProductKind::Engine && value.member == &ProductInstallInfo::imageLocation;
-    info.*value.member = ReadRegistryString(HKEY_LOCAL_MACHINE, productKey, engineImage ? L"SourceDir" : value.valueName,
-                                            info.*value.member);
+  // One key for all the values: the report reads three products at every start.
+  fw::RegistryKey key;
+  if (OpenProductKey(key, HKEY_LOCAL_MACHINE, productKey) == ERROR_SUCCESS) {
+    for (const InstallValue& value : kInstallValues) {
+      // Engine keeps its installation image under another name.
+      const bool engineImage = kind == ProductKind::Engine && value.member == &ProductInstallInfo::imageLocation;
+      key.ReadAnyValueAsText(engineImage ? L"SourceDir" : value.valueName, info.*value.member);
+    }
   }
   info.productVersion = GetCoreProductVersion(info.installDir);
   return info;
