@@ -172,6 +172,9 @@ void CClientAdminDlg::OnSysCommand(UINT command) {
 }
 
 void CClientAdminDlg::ShowAboutBox() {
+  // The build text is formatted before the box opens; a pack without the box's template must not
+  // leave it in the pack's language inside a box built from the program's own template.
+  fw::RevertUnlessDialogTemplateFound(IDD_ABOUTBOX);
   CAboutDlg about;
   LoadInstalledServicePack(about);
   about.DoModal();

@@ -22,6 +22,11 @@ bool RevertToBuiltInResources() {
   return true;
 }
 
+void RevertUnlessDialogTemplateFound(UINT id) {
+  if (FindResourceW(GetResourceHandle(), MAKEINTRESOURCEW(id), RT_DIALOG) == nullptr)
+    RevertToBuiltInResources();
+}
+
 CString LoadString(UINT id) { return LoadStringFrom(GetResourceHandle(), id); }
 
 CString LoadStringFrom(HINSTANCE module, UINT id) {

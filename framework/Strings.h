@@ -19,6 +19,9 @@ void SetResourceHandle(HINSTANCE module);
 // Returns to the program's own resources for the rest of the run: a window the adopted library
 // cannot build is built from them, as without a library. False when they are in use already.
 bool RevertToBuiltInResources();
+// Reverts as above when the module in use has no dialog template id, before the dialog opens:
+// texts loaded for it beforehand then come from the same resources as the dialog itself.
+void RevertUnlessDialogTemplateFound(UINT id);
 
 // String-table entry id of the current resource module; empty when it has none.
 CString LoadString(UINT id);
