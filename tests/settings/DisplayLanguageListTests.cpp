@@ -98,7 +98,9 @@ TEST(LocaleNameCatalog, SystemCatalogFindsWhatTheEnumerationFinds) {
     SCOPED_TRACE(testing::Message() << "folder \"" << row.folder << "\"");
     unsigned short walked = 0xFFFF, got = 0xFFFF;
     const bool found = KVELLocale::GetLangIDFromName(row.folder, walked);
-    if (row.langId >= 0) EXPECT_EQ(walked, row.langId);
+    if (row.langId >= 0) {
+      EXPECT_EQ(walked, row.langId);
+    }
     EXPECT_EQ(found, walked != 0);
     EXPECT_EQ(catalog.LangIdFromName(row.folder, got), found);
     EXPECT_EQ(got, walked);
