@@ -35,7 +35,7 @@ BOOL CClientAdminApp::InitInstance() {
   InitCommonControls(ICC_TREEVIEW_CLASSES | ICC_STANDARD_CLASSES | ICC_LINK_CLASS);
 
   {
-    fw::TraceStartup("main window constructor (icon)");
+    fw::TraceStartup("main window constructor (icon, tree images worker)");
     CClientAdminDlg mainDlg;
     fw::TraceStartup("main window created from its template");
     m_pMainWnd = &mainDlg;

@@ -27,7 +27,9 @@ constexpr COLORREF kTreeMaskColor = RGB(0, 0, 255);
 
 }  // namespace
 
-CClientAdminDlg::CClientAdminDlg(CWnd* parent) : CDialog(IDD_MAPORAADMIN_DIALOG, parent) {
+CClientAdminDlg::CClientAdminDlg(CWnd* parent)
+    : CDialog(IDD_MAPORAADMIN_DIALOG, parent),
+      m_treeImages(fw::GetResourceHandle(), {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}, kPngBackground) {
   m_hIcon = LoadIconW(fw::GetResourceHandle(), MAKEINTRESOURCEW(IDR_MAINFRAME));
 }
 
@@ -52,12 +54,6 @@ const MessageMap* CClientAdminDlg::GetMessageMap() const {
 }
 
 BOOL CClientAdminDlg::OnInitDialog() {
-  fw::TraceStartup("OnInitDialog: tree images decoding started");
-  // The tree's images decode on a worker while the rest of the window is built: the first one
-  // loads GDI+'s codecs, which takes about as long as the settings and the report together. The
-  // tree gets them before the window is shown.
-  fw::PngPreload treeImages(fw::GetResourceHandle(), {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE},
-                            kPngBackground);
   fw::TraceStartup("OnInitDialog: system menu, icon");
   CDialog::OnInitDialog();
 
@@ -77,8 +73,11 @@ BOOL CClientAdminDlg::OnInitDialog() {
   LoadSettings();
   fw::TraceStartup("OnInitDialog: page tree");
   BuildPageTree();
+  // The tree's images have been decoding on a worker since the window was constructed: the first
+  // one loads GDI+'s codecs, which takes about as long as building the window. The tree gets them
+  // before the window is shown, from the resources in use now.
   fw::TraceStartup("OnInitDialog: tree images");
-  SetTreeImages(treeImages.Take());
+  SetTreeImages(m_treeImages.Take(fw::GetResourceHandle()));
   fw::TraceStartup("OnInitDialog done: window shown");
   return TRUE;
 }

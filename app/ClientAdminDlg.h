@@ -11,6 +11,7 @@
 #include "framework/Controls.h"
 #include "framework/Dialog.h"
 #include "framework/PngResource.h"
+#include "framework/PngResource.h"
 #include "inventory/AdminSession.h"
 
 // The shared state of the run (installed products, display language, whether machine settings
@@ -47,6 +48,8 @@ class CClientAdminDlg : public CDialog, public AdminSession {
 
   CTreeCtrl m_wndTree;
   fw::ScopedImageList m_imgTree;
+  // Started with the window, so that GDI+ loads its codecs while the window's template is built.
+  fw::PngPreload m_treeImages;
   HICON m_hIcon = nullptr;  // a shared icon: the system frees it with the module
   HTREEITEM m_hRootItem = nullptr;
   bool m_bPagesCreated = false;

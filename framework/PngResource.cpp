@@ -60,10 +60,11 @@ DWORD WINAPI PngPreload::Work(void* self) {
   return 0;
 }
 
-std::vector<ScopedBitmap> PngPreload::Take() {
-  if (!m_thread) return DecodePngBitmaps(m_module, m_ids, m_background);
+std::vector<ScopedBitmap> PngPreload::Take(HMODULE module) {
+  if (!m_thread) return DecodePngBitmaps(module, m_ids, m_background);
   WaitForSingleObject(m_thread.Get(), INFINITE);
   m_thread.Reset();
+  if (module != m_module) return DecodePngBitmaps(module, m_ids, m_background);
   return std::move(m_bitmaps);
 }
 

@@ -29,9 +29,11 @@ class PngPreload {
   PngPreload(const PngPreload&) = delete;
   PngPreload& operator=(const PngPreload&) = delete;
 
-  // Waits for the worker and hands over its bitmaps, as DecodePngBitmaps gives them; decodes on
-  // the calling thread instead when no worker could be started, or after the first call.
-  std::vector<ScopedBitmap> Take();
+  // Waits for the worker and hands over its bitmaps, as DecodePngBitmaps gives them for module.
+  // Decodes module's on the calling thread instead when the worker decoded another module's (the
+  // program has set a resource library aside since the worker started), when no worker could be
+  // started, or after the first call.
+  std::vector<ScopedBitmap> Take(HMODULE module);
 
  private:
   static DWORD WINAPI Work(void* self);

@@ -63,19 +63,22 @@ std::vector<unsigned char> Pixels(const fw::ScopedBitmap& bitmap) {
 TEST(PngPreload, GivesWhatDecodingHereGivesInTheOrderAsked) {
   const HMODULE console = GetModuleHandleW(nullptr);
   const UINT missing = 1;
-  const struct { const char* name; HMODULE module; std::vector<UINT> ids; std::vector<bool> present; } rows[] = {
-      {"TreeImages", console, {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}, {true, true, true}},
-      {"OtherOrder", console, {IDB_TREE_PAGE, IDB_TREE_WORKSTATION}, {true, true}},
-      {"MissingKeepsItsPlace", console, {IDB_TREE_FOLDER, missing, IDB_TREE_PAGE}, {true, false, true}},
-      {"ModuleWithoutImages", GetModuleHandleW(L"kernel32.dll"), {IDB_TREE_WORKSTATION}, {false}},
-      {"NoImages", console, {}, {}},
+  const HMODULE kernel = GetModuleHandleW(L"kernel32.dll");
+  // taken: the module in use when the images are taken, which the worker may not have decoded.
+  const struct { const char* name; HMODULE module, taken; std::vector<UINT> ids; std::vector<bool> present; } rows[] = {
+      {"TreeImages", console, console, {IDB_TREE_WORKSTATION, IDB_TREE_FOLDER, IDB_TREE_PAGE}, {true, true, true}},
+      {"OtherOrder", console, console, {IDB_TREE_PAGE, IDB_TREE_WORKSTATION}, {true, true}},
+      {"MissingKeepsItsPlace", console, console, {IDB_TREE_FOLDER, missing, IDB_TREE_PAGE}, {true, false, true}},
+      {"ModuleWithoutImages", kernel, kernel, {IDB_TREE_WORKSTATION}, {false}},
+      {"ModuleSetAsideMeanwhile", kernel, console, {IDB_TREE_WORKSTATION}, {true}},
+      {"NoImages", console, console, {}, {}},
   };
   for (const auto& row : rows) {
     SCOPED_TRACE(row.name);
     fw::PngPreload preload(row.module, row.ids, RGB(255, 255, 255));
-    const std::vector<fw::ScopedBitmap> here = fw::DecodePngBitmaps(row.module, row.ids, RGB(255, 255, 255));
+    const std::vector<fw::ScopedBitmap> here = fw::DecodePngBitmaps(row.taken, row.ids, RGB(255, 255, 255));
     // The second Take decodes on this thread: both must give the same.
-    for (const std::vector<fw::ScopedBitmap>& got : {preload.Take(), preload.Take()}) {
+    for (const std::vector<fw::ScopedBitmap>& got : {preload.Take(row.taken), preload.Take(row.taken)}) {
       ASSERT_EQ(got.size(), row.present.size());
       for (size_t i = 0; i < got.size(); ++i) {
         EXPECT_EQ(got[i].IsValid(), row.present[i]) << "image " << i;
