@@ -11,7 +11,6 @@
 #include "framework/Controls.h"
 #include "framework/Dialog.h"
 #include "framework/PngResource.h"
-#include "framework/PngResource.h"
 #include "inventory/AdminSession.h"
 
 // The shared state of the run (installed products, display language, whether machine settings
