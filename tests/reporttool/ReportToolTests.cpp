@@ -36,7 +36,9 @@ std::string FileContent(const std::wstring& path) {
 // MaporaReport run by cmd in a scratch folder with the marker ("NAME=value") set. No run may change HKLM\SOFTWARE
 // or HKCU (Wine's display driver refreshes HKLM\SYSTEM for every process; the test runs alone, see CMakeLists).
 Outcome RunReport(const std::wstring& arguments, const std::wstring& marker = kDesktop) {
-  ScopedDirectory folder(ModuleFolder() + L"\\reporttool-run");
+  // A folder of its own for every run: Wine may close a file of the run before only after the next has started.
+  static int runs = 0;
+  ScopedDirectory folder(ModuleFolder() + L"\\reporttool-run-" + std::to_wstring(++runs));
   folder.MakeDir(L".");
   const std::string command = "MaporaReport " + std::string(arguments.begin(), arguments.end());
   // A watch that could not be set up would let any write pass unseen.
